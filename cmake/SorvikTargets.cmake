@@ -1,0 +1,28 @@
+# Project-wide compile settings and the helpers every folder uses.
+
+add_compile_options(-Wall -Wextra -Werror -Wno-missing-field-initializers)
+
+if(SORVIK_SANITIZE)
+  add_compile_options(-fsanitize=${SORVIK_SANITIZE} -fno-omit-frame-pointer -fno-sanitize-recover=all)
+  add_link_options(-fsanitize=${SORVIK_SANITIZE})
+endif()
+
+# A static, position-independent library that the module and tools link.
+function(sorvik_add_library name)
+  cmake_parse_arguments(ARG "" "" "SOURCES;PUBLIC_LIBS;PRIVATE_LIBS" ${ARGN})
+  add_library(${name} STATIC ${ARG_SOURCES})
+  target_include_directories(${name} PUBLIC ${CMAKE_CURRENT_SOURCE_DIR}/..)
+  target_link_libraries(${name} PUBLIC ${ARG_PUBLIC_LIBS} PRIVATE ${ARG_PRIVATE_LIBS})
+endfunction()
+
+# One GoogleTest executable, registered with CTest test by test.
+# LABELS threaded marks tests that the ThreadSanitizer run repeats.
+function(sorvik_add_gtest name)
+  cmake_parse_arguments(ARG "" "" "SOURCES;LIBS;LABELS;ENVIRONMENT" ${ARGN})
+  add_executable(${name} ${ARG_SOURCES})
+  target_link_libraries(${name} PRIVATE ${ARG_LIBS} sorvik_testsupport GTest::gmock GTest::gtest_main)
+  gtest_discover_tests(${name}
+    DISCOVERY_MODE PRE_TEST
+    DISCOVERY_TIMEOUT 60
+    PROPERTIES LABELS "${ARG_LABELS}" ENVIRONMENT "${ARG_ENVIRONMENT}" TIMEOUT 120)
+endfunction()
