@@ -2,6 +2,12 @@
 
 add_compile_options(-Wall -Wextra -Werror -Wno-missing-field-initializers)
 
+if(SORVIK_FUZZ)
+  add_compile_options(-fsanitize=fuzzer-no-link)
+  add_custom_target(fuzzers)
+  file(WRITE ${CMAKE_BINARY_DIR}/fuzzers.txt "")
+endif()
+
 if(SORVIK_SANITIZE)
   add_compile_options(-fsanitize=${SORVIK_SANITIZE} -fno-omit-frame-pointer -fno-sanitize-recover=all)
   add_link_options(-fsanitize=${SORVIK_SANITIZE})
@@ -25,4 +31,23 @@ function(sorvik_add_gtest name)
     DISCOVERY_MODE PRE_TEST
     DISCOVERY_TIMEOUT 60
     PROPERTIES LABELS "${ARG_LABELS}" ENVIRONMENT "${ARG_ENVIRONMENT}" TIMEOUT 120)
+endfunction()
+
+# A libFuzzer target over LLVMFuzzerTestOneInput. In the fuzz build (clang,
+# SORVIK_FUZZ) it is a real fuzzer; in every other build it is a replay tool
+# that CTest runs over the seed corpus, so the corpus is checked on each run.
+function(sorvik_add_fuzzer name)
+  cmake_parse_arguments(ARG "" "CORPUS" "SOURCES;LIBS" ${ARGN})
+  if(SORVIK_FUZZ)
+    add_executable(${name} ${ARG_SOURCES})
+    target_link_libraries(${name} PRIVATE ${ARG_LIBS})
+    target_link_options(${name} PRIVATE -fsanitize=fuzzer)
+    set_target_properties(${name} PROPERTIES RUNTIME_OUTPUT_DIRECTORY ${CMAKE_BINARY_DIR}/fuzzers)
+    add_dependencies(fuzzers ${name})
+    file(APPEND ${CMAKE_BINARY_DIR}/fuzzers.txt "${name} ${ARG_CORPUS}\n")
+  elseif(SORVIK_BUILD_TESTS)
+    add_executable(${name} ${ARG_SOURCES} ${PROJECT_SOURCE_DIR}/fuzz/replay.cpp)
+    target_link_libraries(${name} PRIVATE ${ARG_LIBS})
+    add_test(NAME fuzz_replay.${name} COMMAND ${name} ${ARG_CORPUS})
+  endif()
 endfunction()

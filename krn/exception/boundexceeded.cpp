@@ -1,0 +1,54 @@
+#include "krn/exception/boundexceeded.h"
+
+#include "krn/utf.h"
+
+namespace cv::krn::exception {
+
+namespace {
+constexpr std::string_view kDescription = "A request was made that would exceed the bounds";
+
+std::string WithDetail(std::string_view detail)
+{
+    std::string text(kDescription);
+    text += ": ";
+    text += detail;
+    return text;
+}
+} // namespace
+
+BoundExceeded::BoundExceeded()
+    : Exception(std::string(kDescription))
+{
+}
+
+BoundExceeded::BoundExceeded(std::string_view sourceFile, std::uint32_t sourceLine)
+    : Exception(std::string(kDescription), sourceFile, sourceLine)
+{
+}
+
+BoundExceeded::BoundExceeded(std::string_view detail)
+    : Exception(WithDetail(detail))
+{
+}
+
+BoundExceeded::BoundExceeded(std::u16string_view detail)
+    : Exception(WithDetail(ToUtf8(detail)))
+{
+}
+
+BoundExceeded::BoundExceeded(std::string_view detail, std::string_view sourceFile, std::uint32_t sourceLine)
+    : Exception(WithDetail(detail), sourceFile, sourceLine)
+{
+}
+
+BoundExceeded::BoundExceeded(std::u16string_view detail, std::string_view sourceFile, std::uint32_t sourceLine)
+    : Exception(WithDetail(ToUtf8(detail)), sourceFile, sourceLine)
+{
+}
+
+std::uint32_t BoundExceeded::Code() const noexcept
+{
+    return 0x8ABC7007u;
+}
+
+} // namespace cv::krn::exception
