@@ -4,8 +4,10 @@
 
 #include <QString>
 
-#include <fstream>
-#include <iterator>
+#include <cerrno>
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
 
 namespace cv::krn::osdep {
 
@@ -40,15 +42,40 @@ std::string_view WithoutByteOrderMark(std::string_view text)
     return text;
 }
 
+// Only a regular file is read: a folder, FIFO or device (an environment
+// variable pointing at the wrong thing) reads as missing rather than
+// failing or blocking. A read error drops the whole file, never half of it.
+std::optional<std::string> ReadRegularFile(const std::filesystem::path &path)
+{
+    const int fd = ::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
+    if (fd < 0)
+        return std::nullopt;
+    struct stat status = {};
+    std::optional<std::string> content;
+    if (::fstat(fd, &status) == 0 && S_ISREG(status.st_mode)) {
+        content.emplace();
+        char buffer[8192];
+        ssize_t count = 0;
+        while ((count = ::read(fd, buffer, sizeof buffer)) != 0) {
+            if (count < 0 && errno == EINTR)
+                continue;
+            if (count < 0) {
+                content.reset();
+                break;
+            }
+            content->append(buffer, static_cast<std::size_t>(count));
+        }
+    }
+    ::close(fd);
+    return content;
+}
+
 } // namespace
 
 IniFile IniFile::Load(const std::filesystem::path &path)
 {
-    std::ifstream in(path, std::ios::binary);
-    if (!in)
-        return {};
-    const std::string content{std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
-    return Parse(content);
+    const std::optional<std::string> content = ReadRegularFile(path);
+    return content ? Parse(*content) : IniFile();
 }
 
 IniFile IniFile::Parse(std::string_view utf8Text)

@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cerrno>
 #include <climits>
+#include <cxxabi.h>
 #include <sys/resource.h>
 #include <unistd.h>
 
@@ -72,11 +73,12 @@ Thread::Thread() = default;
 
 Thread::~Thread()
 {
-    if (m_started && ::pthread_equal(m_handle, ::pthread_self())) {
-        ::pthread_detach(m_handle);
+    if (!m_started)
         return;
-    }
-    Join();
+    if (::pthread_equal(m_handle, ::pthread_self()))
+        ::pthread_detach(m_handle);
+    else
+        ::pthread_join(m_handle, nullptr);
 }
 
 void Thread::Start(int priority, std::size_t stackSize)
@@ -90,11 +92,12 @@ void Thread::Start(int priority, std::size_t stackSize)
     m_result = 0;
     m_failure = nullptr;
     m_running.store(true, std::memory_order_release);
+    m_started = true;
     if (const int error = ::pthread_create(&m_handle, attributes.Get(), &Thread::Entry, this)) {
+        m_started = false;
         m_running.store(false, std::memory_order_release);
         throw PosixError(static_cast<std::uint32_t>(error), kSource, __LINE__);
     }
-    m_started = true;
 }
 
 void Thread::Join()
@@ -114,12 +117,16 @@ void *Thread::Entry(void *self)
     return nullptr;
 }
 
-void Thread::RunBody() noexcept
+void Thread::RunBody()
 {
     if (m_priority != 0)
         ApplyPriority(m_priority);
     try {
         m_result = Run();
+    } catch (abi::__forced_unwind &) {
+        // pthread_exit or cancellation: the unwind must go on.
+        m_running.store(false, std::memory_order_release);
+        throw;
     } catch (const exception::Exception &error) {
         m_result = error.Code();
         m_failure = std::current_exception();

@@ -9,7 +9,8 @@
 
 namespace cv::krn::osdep {
 
-// A thread whose body is the virtual Run() of a derived class.
+// A thread whose body is the virtual Run() of a derived class. Built on
+// pthreads rather than std::thread, which cannot set a stack size.
 //
 // Every derived class must call Join() in its own destructor: by the time
 // ~Thread runs, the derived part is gone, and a body still running would use
@@ -60,7 +61,7 @@ protected:
 
 private:
     static void *Entry(void *self);
-    void RunBody() noexcept;
+    void RunBody();
 
     pthread_t m_handle{};
     bool m_started = false;
