@@ -1,0 +1,408 @@
+// The server API library over its store: what the editor records reaches the
+// view only through a whole commit, and import, export and reset keep the
+// store whole.
+
+#include "tests/reference/rovofixture.h"
+
+#include <sqlite3.h>
+
+#include <fstream>
+
+namespace {
+
+using namespace reftest;
+namespace status = cv::rovo::status;
+
+using Store = RovoTest;
+
+// A second connection to the store file, as another process would have.
+class RawStore
+{
+public:
+    explicit RawStore(const std::string &file) { EXPECT_EQ(sqlite3_open(file.c_str(), &m_db), SQLITE_OK); }
+    ~RawStore() { sqlite3_close(m_db); }
+    void Exec(const char *sql) { EXPECT_EQ(sqlite3_exec(m_db, sql, nullptr, nullptr, nullptr), SQLITE_OK) << sql; }
+
+private:
+    sqlite3 *m_db = nullptr;
+};
+
+std::uint32_t IdleTime(cv::rovo::IConfigurationView *view)
+{
+    return Ok([&](std::int32_t *status) { return view->GetIdleTime(status); });
+}
+
+TEST_F(Store, ANewStoreHasDefaultsAndNoSearchAreas)
+{
+    auto view = View();
+    EXPECT_TRUE(Areas(view.get()).empty());
+    std::uint32_t browse = 1, query = 1;
+    OkVoid([&](std::int32_t *status) { view->GetTimeouts(&browse, &query, status); });
+    EXPECT_EQ(browse + query, 0u) << "unset time-outs read as 0";
+    EXPECT_EQ(Ok([&](std::int32_t *status) { return view->GetFileTimeout(status); }), 60000u);
+    WString index;
+    OkVoid([&](std::int32_t *status) { view->GetIndexPath(&index, status); });
+    EXPECT_EQ(Utf8(index), File("local-index"));
+    EXPECT_EQ(Utf8(Ok([&](std::int32_t *status) { return m_sorvik->GetSorvikName(status); })), "");
+    EXPECT_EQ(Ok([&](std::int32_t *status) { return m_sorvik->GetIndexManager(status); }), nullptr);
+    EXPECT_EQ(Ok([&](std::int32_t *status) { return view->ListExcludedFolders(WString(u"/nowhere"), status); }),
+              nullptr);
+}
+
+TEST_F(Store, TheViewSeesOnlyWhatIsCommitted)
+{
+    auto view = View();
+    {
+        auto editor = Editor();
+        AddArea(editor.get(), u"/data/projects/", u"Projects");
+        AddExcluded(editor.get(), u"/data/projects/tmp", u"tmp");
+        OkVoid([&](std::int32_t *status) { editor->SetIdleTime(300, status); });
+        EXPECT_TRUE(Areas(view.get()).empty());
+        // Released without a commit: nothing happened.
+    }
+    EXPECT_TRUE(Areas(view.get()).empty());
+    EXPECT_EQ(IdleTime(view.get()), 60u);
+
+    auto editor = Editor();
+    AddArea(editor.get(), u"/data/projects/", u"Projects");
+    AddExcluded(editor.get(), u"/data/projects/tmp", u"tmp");
+    AddArea(editor.get(), u"/data/archive", u"Archive");
+    OkVoid([&](std::int32_t *status) { editor->SetIdleTime(300, status); });
+    OkVoid([&](std::int32_t *status) {
+        editor->SetSchedule(cv::rovo::kScheduleWeekly, {1977, 9, 14, 2, 30, 0}, status);
+    });
+    Commit(editor.get());
+    EXPECT_EQ(Areas(view.get()), (std::vector<std::string>{"/data/projects|/data/projects|Projects",
+                                                           "  /data/projects/tmp", "/data/archive|/data/archive|Archive"}));
+    EXPECT_EQ(IdleTime(view.get()), 300u);
+    std::int32_t kind = 0;
+    cv::rovo::CalendarTime when{};
+    OkVoid([&](std::int32_t *status) { view->GetSchedule(&kind, &when, status); });
+    EXPECT_EQ(kind, cv::rovo::kScheduleWeekly);
+    EXPECT_EQ(when.year * 10000 + when.month * 100 + when.day, 19770914);
+    EXPECT_EQ(when.hour * 100 + when.minute, 230);
+    EXPECT_TRUE(Ok([&](std::int32_t *status) { return view->IsExcludedFolder(WString(u"/DATA/Projects/Tmp/"), status); }))
+        << "paths compare without regard to case and a trailing separator";
+
+    // The commit is done once: committing again applies nothing twice.
+    Commit(editor.get());
+    EXPECT_EQ(Areas(view.get()).size(), 3u);
+}
+
+TEST_F(Store, ACommitThatFailsPartWayLeavesTheStoreAsItWas)
+{
+    auto first = Editor();
+    AddArea(first.get(), u"/data/a", u"Alpha");
+    Commit(first.get());
+    const auto before = Areas();
+
+    auto editor = Editor();
+    OkVoid([&](std::int32_t *status) { editor->SetIdleTime(900, status); });
+    AddArea(editor.get(), u"/data/b", u"Beta");
+    OkVoid([&](std::int32_t *status) { editor->RemoveFolder(WString(u"/data/a"), 1, status); });
+    AddArea(editor.get(), u"/data/c", u"beta"); // the alias is taken by the change before it
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) { editor->CommitConfiguration(status); }), status::Conflict);
+    EXPECT_NE(LastError().find("beta"), std::string::npos) << LastError();
+
+    auto view = View();
+    EXPECT_EQ(Areas(view.get()), before);
+    EXPECT_EQ(IdleTime(view.get()), 60u);
+
+    // A search area inside another is refused when the commit is complete, not per change.
+    auto nested = Editor();
+    AddArea(nested.get(), u"/data", u"Everything");
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) { nested->CommitConfiguration(status); }), status::Conflict);
+    OkVoid([&](std::int32_t *status) { nested->RemoveFolder(WString(u"/data/a"), 1, status); });
+    Commit(nested.get());
+    EXPECT_EQ(Areas(), (std::vector<std::string>{"/data|/data|Everything"}));
+}
+
+TEST_F(Store, ASearchAreaAbsorbsTheAreasInsideIt)
+{
+    auto editor = Editor();
+    AddArea(editor.get(), u"D:\\Data\\A", u"A");
+    AddExcluded(editor.get(), u"D:\\Data\\A\\tmp", u"tmp");
+    AddArea(editor.get(), u"D:\\Data\\B", u"B");
+    Commit(editor.get());
+
+    // The order in which the add operations record the merge.
+    auto merge = Editor();
+    AddArea(merge.get(), u"D:\\Data\\", u"Data");
+    OkVoid([&](std::int32_t *status) { merge->RemoveFolder(WString(u"D:\\Data\\A"), 1, status); });
+    AddExcluded(merge.get(), u"D:\\Data\\A\\tmp", u"A\\tmp");
+    OkVoid([&](std::int32_t *status) { merge->RemoveFolder(WString(u"D:\\Data\\B"), 1, status); });
+    Commit(merge.get());
+    EXPECT_EQ(Areas(), (std::vector<std::string>{"D:\\Data|D:\\Data|Data", "  D:\\Data\\A\\tmp"}));
+
+    // Moving an area moves its excluded folders one by one.
+    auto move = Editor();
+    OkVoid([&](std::int32_t *status) {
+        move->MoveFolder(WString(u"D:\\Data"), WString(u"E:\\Data"), WString(u"E:\\Data"), status);
+    });
+    OkVoid([&](std::int32_t *status) {
+        move->MoveFolder(WString(u"D:\\Data\\A\\tmp"), WString(), WString(u"E:\\Data\\A\\tmp"), status);
+    });
+    OkVoid([&](std::int32_t *status) {
+        move->UpdateFolder(WString(u"E:\\Data"), WString(u"E:\\Data"), WString(u"Moved"), 1, 0, status);
+    });
+    Commit(move.get());
+    EXPECT_EQ(Areas(), (std::vector<std::string>{"E:\\Data|E:\\Data|Moved", "  E:\\Data\\A\\tmp"}));
+}
+
+TEST_F(Store, OrderAndRecordTimeChecks)
+{
+    auto editor = Editor();
+    AddArea(editor.get(), u"/a", u"A");
+    AddArea(editor.get(), u"/b", u"B");
+    AddArea(editor.get(), u"/c", u"C");
+    auto order = Container({u"/c", u"/a"});
+    OkVoid([&](std::int32_t *status) { editor->SetSearchAreaOrder(order.get(), status); });
+    Commit(editor.get());
+    EXPECT_EQ(Areas(), (std::vector<std::string>{"/c|/c|C", "/a|/a|A", "/b|/b|B"}));
+
+    // Wrong arguments fail at once and are not recorded.
+    WString result;
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) {
+                  editor->AddFolder(&result, WString(u"/d"), WString(), WString(u"D"), 1, 1, WString(), status);
+              }),
+              status::InvalidArgument);
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) { editor->SetFileTimeout(4999, status); }), status::InvalidArgument);
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) { editor->SetIdleTime(10000, status); }), status::InvalidArgument);
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) { editor->SetSchedule(2, {2005, 2, 30, 0, 0, 0}, status); }),
+              status::InvalidArgument);
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) { editor->SetBrowseTimeout(2, status); }), status::InvalidArgument);
+    Commit(editor.get());
+    EXPECT_EQ(Areas().size(), 3u);
+
+    // Changes that contradict the store fail at the commit.
+    auto unknown = Editor();
+    OkVoid([&](std::int32_t *status) { unknown->RemoveFolder(WString(u"/nowhere"), 1, status); });
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) { unknown->CommitConfiguration(status); }), status::NotFound);
+}
+
+TEST_F(Store, ParseletsDefaultFromTheCatalogueUntilSet)
+{
+    auto view = View();
+    auto active = [&](const char16_t *name) {
+        return Ok([&](std::int32_t *status) { return view->IsParseletActive(WString(name), status); });
+    };
+    auto readers = [&](const char16_t *extension) {
+        auto list = RefPtr<cv::vekex::IStringList>::Adopt(
+            Ok([&](std::int32_t *status) { return view->GetExtensionParselets(WString(extension), status); }));
+        std::vector<std::string> names;
+        for (std::uint32_t i = 0; i < list->GetCount(); ++i)
+            names.push_back(Utf8(list->GetElements()[i]));
+        return names;
+    };
+    EXPECT_EQ(active(u"CSV"), 1);
+    EXPECT_EQ(active(u"MatrixStore"), 0) << "without import support";
+    EXPECT_EQ(active(u"IndexJournal"), 0) << "a system store type";
+    EXPECT_EQ(readers(u"txt"), (std::vector<std::string>{"CSV", "TextTable"}));
+    EXPECT_TRUE(readers(u"mat").empty());
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) { return view->IsParseletActive(WString(u"Nope"), status); }),
+              status::NotFound);
+
+    auto editor = Editor();
+    auto order = Container({u"texttable", u"CSV"});
+    OkVoid([&](std::int32_t *status) { editor->SetExtensionParselets(WString(u"TXT"), order.get(), status); });
+    OkVoid([&](std::int32_t *status) { editor->SetParseletActive(WString(u"MatrixStore"), 1, status); });
+    auto names = Container({u"qdm"});
+    OkVoid([&](std::int32_t *status) { editor->ReindexParselets(names.get(), status); });
+    auto wrong = Container({u"WaveAudio"});
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) { editor->SetExtensionParselets(WString(u"txt"), wrong.get(), status); }),
+              status::InvalidArgument);
+    Commit(editor.get());
+    EXPECT_EQ(readers(u"txt"), (std::vector<std::string>{"TextTable", "CSV"}));
+    EXPECT_EQ(readers(u"mat"), (std::vector<std::string>{"MatrixStore"}));
+
+    auto off = Editor();
+    OkVoid([&](std::int32_t *status) { off->SetParseletActive(WString(u"TextTable"), 0, status); });
+    Commit(off.get());
+    EXPECT_EQ(readers(u"txt"), (std::vector<std::string>{"CSV"}));
+}
+
+TEST_F(Store, ThePolicyInTheStoreForbidsSearchAreas)
+{
+    RawStore(StoreFile()).Exec("INSERT INTO area_policy(prefix) VALUES ('/etc'), ('C:\\Windows')");
+    auto editor = Editor();
+    auto allowed = [&](const char16_t *path, std::int32_t isArea) {
+        return Ok([&](std::int32_t *status) {
+            return editor->CheckAreaAllowed(WString(path), WString(path), WString(u"x"), isArea, 1 - isArea, status);
+        });
+    };
+    EXPECT_EQ(allowed(u"/etc/ssl", 1), cv::rovo::kAreaNotAllowed);
+    EXPECT_EQ(allowed(u"c:\\windows\\temp", 1), cv::rovo::kAreaNotAllowed);
+    EXPECT_EQ(allowed(u"/etcetera", 1), cv::rovo::kAreaAllowed);
+    EXPECT_EQ(allowed(u"/etc/ssl", 0), cv::rovo::kAreaAllowed) << "excluding is always allowed";
+
+    // The commit holds to the policy too.
+    AddArea(editor.get(), u"/etc", u"Config");
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) { editor->CommitConfiguration(status); }), status::NotAllowed);
+    EXPECT_TRUE(Areas().empty());
+}
+
+TEST_F(Store, ACommitWaitsForAnotherWriterThenTimesOut)
+{
+    testsupport::ScopedEnv timeout("CORVANE_SORVIK_COMMIT_TIMEOUT_MS", "50");
+    auto editor = Editor();
+    AddArea(editor.get(), u"/data", u"Data");
+    {
+        RawStore other(StoreFile());
+        other.Exec("BEGIN IMMEDIATE");
+        EXPECT_EQ(StatusOf([&](std::int32_t *status) { editor->CommitConfiguration(status); }), status::UpdateTimedOut);
+        other.Exec("ROLLBACK");
+    }
+    // The recorded change survived the time-out and goes through now.
+    Commit(editor.get());
+    EXPECT_EQ(Areas().size(), 1u);
+}
+
+TEST_F(Store, ExportThenImportReproducesTheConfiguration)
+{
+    auto editor = Editor();
+    AddArea(editor.get(), u"/data/one", u"One & <Two>");
+    AddExcluded(editor.get(), u"/data/one/cache", u"cache");
+    AddArea(editor.get(), u"/data/three", u"Three");
+    OkVoid([&](std::int32_t *status) { editor->SetFileTimeout(120000, status); });
+    OkVoid([&](std::int32_t *status) { editor->SetSearchQueryTimeout(45, status); });
+    OkVoid([&](std::int32_t *status) { editor->SetIndexPath(WString(u"/var/index/"), status); });
+    OkVoid([&](std::int32_t *status) { editor->SetParseletActive(WString(u"HDF5"), 0, status); });
+    auto order = Container({u"TextTable", u"CSV"});
+    OkVoid([&](std::int32_t *status) { editor->SetExtensionParselets(WString(u"txt"), order.get(), status); });
+    Commit(editor.get());
+
+    const std::string exported = File("exported.skc");
+    auto view = View();
+    OkVoid([&](std::int32_t *status) { view->ExportConfiguration(WString(U16(exported)), editor.get(), status); });
+
+    // Into another Sorvik: nothing arrives before its commit.
+    auto other = Open(u"<Name>Lab Server</Name><SorvikType>valdorn</SorvikType>");
+    EXPECT_EQ(Utf8(Ok([&](std::int32_t *status) { return other->GetSorvikName(status); })), "Lab Server");
+    auto otherView = View(other.get());
+    auto otherEditor = Editor(other.get());
+    OkVoid([&](std::int32_t *status) {
+        otherView->ImportConfiguration(WString(U16(exported)), otherEditor.get(), status);
+    });
+    EXPECT_TRUE(Areas(otherView.get()).empty());
+    Commit(otherEditor.get());
+    EXPECT_EQ(Areas(otherView.get()), Areas(view.get()));
+
+    const std::string again = File("again.skc");
+    OkVoid([&](std::int32_t *status) { otherView->ExportConfiguration(WString(U16(again)), nullptr, status); });
+    EXPECT_EQ(Slurp(again), Slurp(exported));
+}
+
+TEST_F(Store, AnExportCarriesUncommittedEditsWithoutCommittingThem)
+{
+    auto editor = Editor();
+    AddArea(editor.get(), u"/pending", u"Pending");
+    const std::string file = File("pending.skc");
+    auto view = View();
+    OkVoid([&](std::int32_t *status) { view->ExportConfiguration(WString(U16(file)), editor.get(), status); });
+    EXPECT_NE(Slurp(file).find("alias=\"Pending\""), std::string::npos);
+    EXPECT_TRUE(Areas(view.get()).empty());
+    Commit(editor.get());
+    EXPECT_EQ(Areas(view.get()).size(), 1u);
+}
+
+TEST_F(Store, BrokenConfigurationFilesAreRefusedAndChangeNothing)
+{
+    auto editor = Editor();
+    AddArea(editor.get(), u"/kept", u"Kept");
+    Commit(editor.get());
+    const std::string good = File("good.skc");
+    auto view = View();
+    OkVoid([&](std::int32_t *status) { view->ExportConfiguration(WString(U16(good)), nullptr, status); });
+    const std::string content = Slurp(good);
+
+    const std::pair<const char *, std::string> broken[] = {
+        {"truncated", content.substr(0, content.size() / 2)},
+        {"empty", ""},
+        {"not xml", "garbage"},
+        {"nested areas", "<sorvikconfiguration format=\"1\"><searchareas>"
+                         "<searcharea path=\"/a\" alias=\"A\"/><searcharea path=\"/a/b\" alias=\"B\"/></searchareas>"
+                         "<indexer idletime=\"1\" filetimeout=\"60000\" changetrigger=\"1\" triggerscope=\"0\" "
+                         "triggerevents=\"15\" schedulekind=\"2\" scheduletime=\"2005-06-27T02:00:00Z\"/>"
+                         "<advanced browsetimeout=\"0\" querytimeout=\"0\" indexpath=\"/i\"/></sorvikconfiguration>"},
+        {"bad value", std::string(content).replace(content.find("idletime=\"60\""), 13, "idletime=\"-1\"")},
+        {"unknown parselet", std::string(content).replace(content.find("<parselets/>"), 12,
+                                                          "<parselets><parselet name=\"Gone\" active=\"1\"/></parselets>")},
+    };
+    for (const auto &[name, text] : broken) {
+        const std::string file = File("broken.skc");
+        std::ofstream(file, std::ios::trunc | std::ios::binary) << text;
+        EXPECT_EQ(StatusOf([&](std::int32_t *status) {
+                      view->ImportConfiguration(WString(U16(file)), editor.get(), status);
+                  }),
+                  status::FileMalformed)
+            << name;
+    }
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) {
+                  view->ImportConfiguration(WString(U16(File("missing.skc"))), editor.get(), status);
+              }),
+              status::FileUnreadable);
+    // Nothing was recorded by the refused imports.
+    Commit(editor.get());
+    EXPECT_EQ(Areas(view.get()), (std::vector<std::string>{"/kept|/kept|Kept"}));
+    // An unwritable target is reported.
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) {
+                  view->ExportConfiguration(WString(U16(File("no/such/folder/x.skc"))), nullptr, status);
+              }),
+              status::FileWriteFailed);
+}
+
+TEST_F(Store, ResetThrowsAwayTheIndexAndOptionallyTheConfiguration)
+{
+    auto editor = Editor();
+    AddArea(editor.get(), u"/data", u"Data");
+    OkVoid([&](std::int32_t *status) { editor->SetIdleTime(5, status); });
+    Commit(editor.get());
+
+    OkVoid([&](std::int32_t *status) { m_sorvik->ResetSorvik(cv::rovo::kResetIndex, 0, status); });
+    EXPECT_EQ(Areas().size(), 1u);
+    OkVoid([&](std::int32_t *status) { m_sorvik->ResetSorvik(cv::rovo::kResetIndexAndConfiguration, 0, status); });
+    auto view = View();
+    EXPECT_TRUE(Areas(view.get()).empty());
+    EXPECT_EQ(IdleTime(view.get()), 60u);
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) { m_sorvik->ResetSorvik(5, 0, status); }), status::InvalidArgument);
+}
+
+TEST_F(Store, ConnectionTextsNameSeparateStores)
+{
+    auto named = Open(u"<SorvikType>other</SorvikType>\n<PortName>Lab&amp;Test</PortName>");
+    EXPECT_EQ(Utf8(Ok([&](std::int32_t *status) { return named->GetSorvikName(status); })), "Lab&Test");
+    auto editor = Editor(named.get());
+    AddArea(editor.get(), u"/lab", u"Lab");
+    Commit(editor.get());
+    EXPECT_TRUE(Areas().empty()) << "the local Sorvik keeps its own store";
+    EXPECT_TRUE(std::filesystem::exists(StoreFile("sorvik-lab%26test.sorvikdb")));
+
+    for (const char16_t *text : {u"<Name>unterminated", u"stray text", u"<Name>x</Other>"}) {
+        EXPECT_EQ(StatusOf([&](std::int32_t *status) { return m_environment->OpenSorvik(WString(text), status); }),
+                  status::InvalidConnection)
+            << Utf8(WString(text));
+    }
+}
+
+TEST_F(Store, ABrokenStoreIsRefusedAndLeftAsItIs)
+{
+    const std::string file = StoreFile("sorvik-broken.sorvikdb");
+    const std::string garbage = "SQLite format 3" + std::string(200, '\x7f');
+    std::ofstream(file, std::ios::binary) << garbage;
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) {
+                  return m_environment->OpenSorvik(WString(u"<Name>broken</Name>"), status);
+              }),
+              status::StoreCorrupt);
+    EXPECT_EQ(Slurp(file), garbage);
+
+    // Another program's database is not taken over.
+    const std::string foreign = StoreFile("sorvik-foreign.sorvikdb");
+    RawStore(foreign).Exec("CREATE TABLE notes(text TEXT)");
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) {
+                  return m_environment->OpenSorvik(WString(u"<Name>foreign</Name>"), status);
+              }),
+              status::StoreCorrupt);
+    EXPECT_NE(LastError().find("not a Sorvik store"), std::string::npos) << LastError();
+}
+
+} // namespace
