@@ -2,6 +2,13 @@
 
 add_compile_options(-Wall -Wextra -Werror -Wno-missing-field-initializers)
 
+# GCC's unique symbols (from inline statics such as make_shared's) mark a
+# library as never unloadable; the module must be able to release the
+# product libraries it loads.
+if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
+  add_compile_options(-fno-gnu-unique)
+endif()
+
 if(SORVIK_FUZZ)
   add_compile_options(-fsanitize=fuzzer-no-link)
   add_custom_target(fuzzers)

@@ -47,7 +47,12 @@ std::u16string QtHostNetwork::LocalHostName()
 
 std::vector<QHostAddress> QtHostNetwork::Resolve(std::u16string_view host)
 {
-    const QHostInfo info = QHostInfo::fromName(QString::fromUtf16(host.data(), static_cast<qsizetype>(host.size())));
+    const QString name = QString::fromUtf16(host.data(), static_cast<qsizetype>(host.size()));
+    // An address text is its own answer; QHostInfo would ask the name service
+    // for a reverse lookup first.
+    if (const QHostAddress literal(name); !literal.isNull())
+        return {literal};
+    const QHostInfo info = QHostInfo::fromName(name);
     if (info.error() != QHostInfo::NoError || info.addresses().isEmpty())
         throw NotResolvedException("HostInfo", __LINE__);
     const QList<QHostAddress> addresses = info.addresses();

@@ -40,7 +40,7 @@ void ApplyPriority(int priority)
 std::size_t UsableStackSize(std::size_t requested)
 {
     const long minimum = ::sysconf(_SC_THREAD_STACK_MIN);
-    const std::size_t floor = minimum > 0 ? static_cast<std::size_t>(minimum) : std::size_t{PTHREAD_STACK_MIN};
+    const std::size_t floor = minimum > 0 ? static_cast<std::size_t>(minimum) : static_cast<std::size_t>(PTHREAD_STACK_MIN);
     return std::max(requested, floor);
 }
 
