@@ -5,36 +5,31 @@
 namespace cv::krn::exception {
 
 namespace {
-std::string WithDetail(std::string_view detail)
-{
-    std::string text = "Access denied: ";
-    text += detail;
-    return text;
-}
+constexpr std::string_view kDescription = "Access denied";
 } // namespace
 
 AccessDenied::AccessDenied()
-    : Exception(WithDetail({}))
+    : Exception(WithDetail(kDescription, {}))
 {
 }
 
 AccessDenied::AccessDenied(std::string_view detail)
-    : Exception(WithDetail(detail))
+    : Exception(WithDetail(kDescription, detail))
 {
 }
 
 AccessDenied::AccessDenied(std::u16string_view detail)
-    : Exception(WithDetail(ToUtf8(detail)))
+    : Exception(WithDetail(kDescription, ToUtf8(detail)))
 {
 }
 
 AccessDenied::AccessDenied(std::string_view detail, std::string_view sourceFile, std::uint32_t sourceLine)
-    : Exception(WithDetail(detail), sourceFile, sourceLine)
+    : Exception(WithDetail(kDescription, detail), sourceFile, sourceLine)
 {
 }
 
 AccessDenied::AccessDenied(std::u16string_view detail, std::string_view sourceFile, std::uint32_t sourceLine)
-    : Exception(WithDetail(ToUtf8(detail)), sourceFile, sourceLine)
+    : Exception(WithDetail(kDescription, ToUtf8(detail)), sourceFile, sourceLine)
 {
 }
 

@@ -6,14 +6,6 @@ namespace cv::krn::exception {
 
 namespace {
 constexpr std::string_view kDescription = "A request was made that would exceed the bounds";
-
-std::string WithDetail(std::string_view detail)
-{
-    std::string text(kDescription);
-    text += ": ";
-    text += detail;
-    return text;
-}
 } // namespace
 
 BoundExceeded::BoundExceeded()
@@ -27,22 +19,22 @@ BoundExceeded::BoundExceeded(std::string_view sourceFile, std::uint32_t sourceLi
 }
 
 BoundExceeded::BoundExceeded(std::string_view detail)
-    : Exception(WithDetail(detail))
+    : Exception(WithDetail(kDescription, detail))
 {
 }
 
 BoundExceeded::BoundExceeded(std::u16string_view detail)
-    : Exception(WithDetail(ToUtf8(detail)))
+    : Exception(WithDetail(kDescription, ToUtf8(detail)))
 {
 }
 
 BoundExceeded::BoundExceeded(std::string_view detail, std::string_view sourceFile, std::uint32_t sourceLine)
-    : Exception(WithDetail(detail), sourceFile, sourceLine)
+    : Exception(WithDetail(kDescription, detail), sourceFile, sourceLine)
 {
 }
 
 BoundExceeded::BoundExceeded(std::u16string_view detail, std::string_view sourceFile, std::uint32_t sourceLine)
-    : Exception(WithDetail(ToUtf8(detail)), sourceFile, sourceLine)
+    : Exception(WithDetail(kDescription, ToUtf8(detail)), sourceFile, sourceLine)
 {
 }
 

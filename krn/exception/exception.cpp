@@ -30,6 +30,14 @@ Exception::Exception(std::string description, std::string_view sourceFile, std::
 
 Exception::~Exception() = default;
 
+std::string Exception::WithDetail(std::string_view prefix, std::string_view detail)
+{
+    std::string text(prefix);
+    text += ": ";
+    text += detail;
+    return text;
+}
+
 std::string Exception::Description() const
 {
     return *m_description;

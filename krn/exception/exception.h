@@ -30,6 +30,9 @@ public:
     std::optional<std::string> SourceFile() const;
 
 protected:
+    // prefix + ": " + detail, the description of the detail variants.
+    static std::string WithDetail(std::string_view prefix, std::string_view detail);
+
     explicit Exception(std::string description);
     Exception(std::string description, std::string_view sourceFile, std::uint32_t sourceLine);
 

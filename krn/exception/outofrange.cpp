@@ -6,14 +6,6 @@ namespace cv::krn::exception {
 
 namespace {
 constexpr std::string_view kDescription = "Out of range";
-
-std::string WithDetail(std::string_view detail)
-{
-    std::string text(kDescription);
-    text += ": ";
-    text += detail;
-    return text;
-}
 } // namespace
 
 OutOfRange::OutOfRange()
@@ -27,22 +19,22 @@ OutOfRange::OutOfRange(std::string_view sourceFile, std::uint32_t sourceLine)
 }
 
 OutOfRange::OutOfRange(std::string_view detail)
-    : Exception(WithDetail(detail))
+    : Exception(WithDetail(kDescription, detail))
 {
 }
 
 OutOfRange::OutOfRange(std::u16string_view detail)
-    : Exception(WithDetail(ToUtf8(detail)))
+    : Exception(WithDetail(kDescription, ToUtf8(detail)))
 {
 }
 
 OutOfRange::OutOfRange(std::string_view detail, std::string_view sourceFile, std::uint32_t sourceLine)
-    : Exception(WithDetail(detail), sourceFile, sourceLine)
+    : Exception(WithDetail(kDescription, detail), sourceFile, sourceLine)
 {
 }
 
 OutOfRange::OutOfRange(std::u16string_view detail, std::string_view sourceFile, std::uint32_t sourceLine)
-    : Exception(WithDetail(ToUtf8(detail)), sourceFile, sourceLine)
+    : Exception(WithDetail(kDescription, ToUtf8(detail)), sourceFile, sourceLine)
 {
 }
 
