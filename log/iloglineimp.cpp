@@ -33,25 +33,28 @@ void ILogLineImp::AppendFormat(const char *format, ...)
 {
     if (!format)
         return;
-    char buffer[text::kFormatBufferSize];
     std::va_list args;
     va_start(args, format);
-    const std::size_t length = text::FormatPrintf(buffer, format, args);
+    AppendFormatted(format, args);
     va_end(args);
-    text::AppendUtf8(m_text, std::string_view(buffer, length));
 }
 
 void ILogLineImp::AppendFormatLine(const char *format, ...)
 {
     if (!format)
         return;
-    char buffer[text::kFormatBufferSize];
     std::va_list args;
     va_start(args, format);
-    const std::size_t length = text::FormatPrintf(buffer, format, args);
+    AppendFormatted(format, args);
     va_end(args);
-    text::AppendUtf8(m_text, std::string_view(buffer, length));
     m_text.append(m_glob.LineEnd());
+}
+
+void ILogLineImp::AppendFormatted(const char *format, std::va_list args)
+{
+    char buffer[text::kFormatBufferSize];
+    const std::size_t length = text::FormatPrintf(buffer, format, args);
+    text::AppendUtf8(m_text, std::string_view(buffer, length));
 }
 
 std::uint32_t ILogLineImp::AddRef() noexcept

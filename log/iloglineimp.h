@@ -4,6 +4,7 @@
 #include "log/ilogline.h"
 
 #include <atomic>
+#include <cstdarg>
 #include <cstdint>
 #include <string>
 
@@ -38,6 +39,8 @@ public:
     std::uint32_t Release() override;
 
 private:
+    void AppendFormatted(const char *format, std::va_list args);
+
     ILogGlob &m_glob;
     std::u16string m_text;
     std::atomic<std::uint32_t> m_refCount{1};
