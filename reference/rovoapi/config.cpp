@@ -1,7 +1,7 @@
 #include "reference/rovoapi/config.h"
 
 #include "reference/libsupport/refobject.h"
-#include "reference/rovoapi/db.h"
+#include "reference/libsupport/db.h"
 
 #include <QDate>
 #include <QRegularExpression>

@@ -7,7 +7,7 @@
 // "sorvik-<name>.sorvikdb" for a named one (name case folded, characters
 // other than a-z 0-9 . _ - written as %XX of their UTF-8 bytes).
 
-#include "reference/rovoapi/db.h"
+#include "reference/libsupport/db.h"
 
 #include <QString>
 

@@ -8,7 +8,7 @@
 
 #include "reference/rovoapi/catalogueinfo.h"
 #include "reference/rovoapi/config.h"
-#include "reference/rovoapi/db.h"
+#include "reference/libsupport/db.h"
 
 #include <QString>
 

@@ -1,4 +1,4 @@
-#include "reference/rovoapi/db.h"
+#include "reference/libsupport/db.h"
 
 #include "reference/libsupport/refobject.h"
 #include "sorvik/rovoapi.h"

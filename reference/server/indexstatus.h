@@ -1,0 +1,50 @@
+#pragma once
+
+#include "reference/libsupport/db.h"
+
+#include <QString>
+
+#include <cstdint>
+#include <mutex>
+#include <string>
+
+namespace sorvik::server {
+
+// What the server knows about its index: element counts per level, the
+// crawl-stop flag, time-outs per Parselet and the failure counters. Kept in
+// "status.sqlite" in the index folder, so an administrator (or a test) can
+// look at it and change it with the sqlite3 tool while the server runs.
+//
+// Thread-safe: every connection of the server shares one.
+class IndexStatus
+{
+public:
+    // Opens or creates the status file in indexFolder, creating the folder.
+    // Raises ref::Failure when it cannot.
+    explicit IndexStatus(const QString &indexFolder);
+
+    static QString FileIn(const QString &indexFolder);
+
+    std::uint32_t ElementCount(std::uint32_t kind);
+    bool DiskIsFullCrawlStop();
+    std::uint32_t FileviewsTimeouted();
+    struct PerParselet
+    {
+        std::uint32_t entries = 0;
+        std::u16string text; // "name$count;" per Parselet, in name order
+    };
+    PerParselet FileviewsTimeoutedPerParselet();
+
+    void ResetTimeouted();
+    void ResetFailure();
+    void ResetNotMyFile();
+
+private:
+    std::uint32_t Counter(const char *name);
+    void SetCounter(const char *name, std::int64_t value);
+
+    std::mutex m_lock;
+    rovo::Db m_db;
+};
+
+} // namespace sorvik::server

@@ -1,0 +1,138 @@
+#include "reference/server/server.h"
+
+#include "dunemere/instancenames.h"
+#include "krn/osdep/mutex.h"
+#include "reference/comm/listener.h"
+#include "sorvik/rovocomm.h"
+#include "reference/libsupport/refobject.h"
+#include "reference/server/indexstatus.h"
+#include "reference/server/logonacceptor.h"
+#include "reference/server/protocolsession.h"
+#include "reference/server/storeconfiguration.h"
+
+#include <list>
+#include <mutex>
+#include <stdexcept>
+#include <thread>
+
+namespace sorvik::server {
+
+namespace {
+
+// How often waiting threads look at the stop flag.
+constexpr std::uint32_t kPollMilliseconds = 100;
+
+using cv::vek::rovo::comm::FramedSocket;
+using cv::vek::rovo::comm::kResultOk;
+using cv::vek::rovo::comm::kResultTimeout;
+
+std::unique_ptr<cv::krn::osdep::Mutex> Hold(std::u16string_view name, const char *what)
+{
+    auto mutex = std::make_unique<cv::krn::osdep::Mutex>(name);
+    if (!mutex->TryAcquire())
+        throw std::runtime_error(std::string("another server holds the ") + what);
+    return mutex;
+}
+
+void Serve(FramedSocket &socket, ServerContext &context, const std::atomic<bool> &stop)
+{
+    ProtocolSession session(context);
+    cv::krn::ByteBuffer record;
+    while (!stop.load()) {
+        const std::uint32_t result = socket.Receive(record, kPollMilliseconds);
+        if (result == kResultTimeout)
+            continue;
+        if (result != kResultOk)
+            return;
+        const auto response = session.Handle(record.bytes());
+        if (!response || socket.Send(response->bytes(), cv::vek::rovo::comm::kInfinite) != kResultOk)
+            return;
+    }
+}
+
+} // namespace
+
+struct Server::State
+{
+    ServerOptions options;
+    std::unique_ptr<cv::krn::osdep::Mutex> globalMutex;
+    std::unique_ptr<cv::krn::osdep::Mutex> instanceMutex;
+    std::unique_ptr<IndexStatus> status;
+    std::atomic<std::uint32_t> loggedOnUsers{0};
+    AcceptorFactory makeKerberosAcceptor;
+    cv::vek::rovo::comm::Listener listener;
+};
+
+Server::Server(ServerOptions options, AcceptorFactory makeKerberosAcceptor) : m_state(std::make_unique<State>())
+{
+    State &state = *m_state;
+    state.options = std::move(options);
+    state.makeKerberosAcceptor = std::move(makeKerberosAcceptor);
+    const std::u16string &portName = state.options.portName;
+
+    // The mutexes come first: clients decide by them whether a server runs.
+    if (portName.empty())
+        state.globalMutex = Hold(cv::vek::rovo::dunemere::kGlobalServerMutexName, "global server mutex");
+    state.instanceMutex = Hold(cv::vek::rovo::dunemere::InstanceMutexName(portName), "instance mutex");
+
+    try {
+        state.status = std::make_unique<IndexStatus>(IndexFolderOf(portName));
+    } catch (const ref::Failure &failure) {
+        throw std::runtime_error("cannot open the index status: " +
+                                 QString::fromStdU16String(failure.text).toStdString());
+    }
+
+    if (portName.empty())
+        state.listener.ListenLocal(u"VEK_INDEX_SERVICE", u"VEK_INDEX_SERVICE_SEARCH_BROWSE");
+    else
+        state.listener.ListenLocal(portName, u"VEK_INDEX_SERVICE_SERVER");
+}
+
+Server::~Server() = default;
+
+void Server::Run(const std::atomic<bool> &stop)
+{
+    State &state = *m_state;
+    ServerContext context{state.options, *state.status, state.loggedOnUsers, state.makeKerberosAcceptor};
+
+    struct Connection
+    {
+        std::unique_ptr<FramedSocket> socket;
+        std::thread thread;
+        std::atomic<bool> done{false};
+    };
+    std::list<Connection> connections;
+    auto reapFinished = [&connections] {
+        for (auto it = connections.begin(); it != connections.end();) {
+            if (it->done.load()) {
+                it->thread.join();
+                it = connections.erase(it);
+            } else {
+                ++it;
+            }
+        }
+    };
+
+    while (!stop.load()) {
+        auto socket = state.listener.Accept(kPollMilliseconds);
+        reapFinished();
+        if (!socket)
+            continue;
+        Connection &connection = connections.emplace_back();
+        connection.socket = std::move(socket);
+        connection.thread = std::thread([&connection, &context, &stop] {
+            try {
+                Serve(*connection.socket, context, stop);
+            } catch (const std::exception &) {
+                // Out of memory or a failing store: this client loses its
+                // connection, the others keep theirs.
+            }
+            connection.socket->Close();
+            connection.done.store(true);
+        });
+    }
+    for (Connection &connection : connections)
+        connection.thread.join();
+}
+
+} // namespace sorvik::server
