@@ -1,0 +1,219 @@
+#include "serverfixture.h"
+
+#include "dunemere/config.h"
+#include "dunemere/directstoreaccess.h"
+#include "dunemere/instancenames.h"
+#include "dunemere/requestorbase.h"
+#include "dunemere/requesttransferdata.h"
+#include "dunemere/responsetransferdata.h"
+#include "dunemere/tointmsgda.h"
+#include "log/ilogimp.h"
+#include "sorvik/packedversion.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <signal.h>
+
+#include <condition_variable>
+#include <mutex>
+#include <thread>
+
+namespace {
+
+using namespace cv::vek::rovo::dunemere;
+using cv::vek::rovo::RequestorBase;
+using reftest::ServerTest;
+using sorvik::PackVersion;
+
+[[maybe_unused]] const bool g_registry = (reftest::InstallServerRegistry(), true);
+
+struct AccessRef
+{
+    IDirectStoreAccess *access;
+    ~AccessRef() { access->Release(); }
+    IDirectStoreAccess *operator->() const { return access; }
+    std::uint32_t Version() const { return static_cast<CDirectStoreAccess *>(access)->Settings().GetServerVersion(); }
+};
+
+bool MutexHeld(std::u16string_view name)
+{
+    cv::krn::osdep::Mutex mutex(name);
+    if (!mutex.TryAcquire())
+        return true;
+    mutex.Release();
+    return false;
+}
+
+template <typename Condition>
+bool WaitFor(Condition condition, std::chrono::milliseconds within = std::chrono::seconds(10))
+{
+    const auto deadline = std::chrono::steady_clock::now() + within;
+    while (!condition()) {
+        if (std::chrono::steady_clock::now() >= deadline)
+            return false;
+        std::this_thread::sleep_for(std::chrono::milliseconds(10));
+    }
+    return true;
+}
+
+TEST_F(ServerTest, StatisticsComeFromTheIndexStatusAndResetsChangeIt)
+{
+    auto server = Start({"--portname", "P"}, "P");
+    AccessRef access{CreateDirectStoreAccess(u"P", 0)};
+    EXPECT_EQ(access->GetElementCount(8), 0u);
+
+    Sql("INSERT INTO element_counts VALUES (8, 120), (16, 7), (32, 3456);"
+        "INSERT INTO parselet_timeouts VALUES ('CSV', 3), ('HDF', 2);"
+        "INSERT INTO counters VALUES ('disk_full_crawl_stop', 1), ('failures', 4), ('not_my_file', 5);");
+    EXPECT_EQ(access->GetElementCount(8), 120u);
+    EXPECT_EQ(access->GetElementCount(16), 7u);
+    EXPECT_EQ(access->GetElementCount(32), 3456u);
+    EXPECT_EQ(access->GetUserCount(0), 1u);
+    EXPECT_TRUE(access->GetDiskIsFullCrawlStop());
+    EXPECT_EQ(access->GetFileviewsTimeouted(), 5u);
+    std::u16string names[2];
+    std::uint32_t counts[2] = {};
+    std::uint32_t total = 0;
+    access->GetFileviewsTimeoutedPerPlugIn(2, names, counts, &total);
+    EXPECT_EQ(total, 2u);
+    EXPECT_EQ(names[0], u"CSV");
+    EXPECT_EQ(counts[0], 3u);
+    EXPECT_EQ(names[1], u"HDF");
+    EXPECT_EQ(counts[1], 2u);
+
+    access->ResetIndexStatusTimeouted(); // 18.0.0 no longer knows it
+    EXPECT_EQ(access->GetFileviewsTimeouted(), 5u);
+    access->ResetIndexStatusFailure();
+    access->ResetIndexStatusNotMyFile();
+    AccessRef second{CreateDirectStoreAccess(u"P", 0)};
+    EXPECT_EQ(second->GetUserCount(0), 2u);
+
+    EXPECT_EQ(server->Stop(SIGTERM), 0);
+    EXPECT_FALSE(std::filesystem::exists(testsupport::SorvikProcess::SocketOf("P")));
+    EXPECT_FALSE(MutexHeld(InstanceMutexName(u"P")));
+}
+
+TEST_F(ServerTest, OlderServersAreSpokenToInTheirVersion)
+{
+    {
+        auto server = Start({"--portname", "Old", "--version", "3.1.0"}, "Old");
+        AccessRef access{CreateDirectStoreAccess(u"Old", 0)};
+        EXPECT_EQ(access->GetElementCount(8), 0u);
+        EXPECT_EQ(access.Version(), PackVersion(3, 1, 0));
+        Sql("INSERT INTO parselet_timeouts VALUES ('CSV', 3)");
+        access->ResetIndexStatusTimeouted();
+        EXPECT_EQ(access->GetFileviewsTimeouted(), 0u);
+    }
+    {
+        auto server = Start({"--portname", "New", "--version", "19.0.0"}, "New");
+        AccessRef access{CreateDirectStoreAccess(u"New", 0)};
+        EXPECT_EQ(access->GetElementCount(8), 0u);
+        EXPECT_EQ(access.Version(), PackVersion(18, 0, 0)) << "the newest version this client speaks";
+        EXPECT_EQ(access->GetElementCount(8), 0u) << "an 18.0.0 request is served";
+    }
+}
+
+TEST_F(ServerTest, ClientProofIsChecked)
+{
+    auto server = Start({"--portname", "Id", "--identification", "tool", "--secretkey", "s3cret"}, "Id");
+    AccessRef right{CreateDirectStoreAccessWithIdentification(u"Id", 0, u"tool", u"s3cret")};
+    EXPECT_EQ(right->GetElementCount(8), 0u);
+    AccessRef wrong{CreateDirectStoreAccessWithIdentification(u"Id", 0, u"tool", u"guess")};
+    EXPECT_EQ(wrong->GetElementCount(8), IDirectStoreAccess::kFailure);
+    AccessRef none{CreateDirectStoreAccess(u"Id", 0)};
+    EXPECT_EQ(none->GetElementCount(8), IDirectStoreAccess::kFailure);
+
+    cv::util::file::log::ILogImp log;
+    PLUGIN::Config config(u"<server>localhost</server><portname>Id</portname><clientidentificationstring>tool"
+                          u"</clientidentificationstring><clientidentificationsecretkey>guess"
+                          u"</clientidentificationsecretkey>");
+    RequestorBase requestor(config, log);
+    try {
+        requestor.Connect(false, 3);
+        ADD_FAILURE() << "a wrong proof logged on";
+    } catch (const DataCache::ToIntMsgDa &error) {
+        EXPECT_EQ(error.Code(), 181u);
+        const std::u16string &message = error.Message();
+        EXPECT_NE(message.find(u"Server Error: Permission denied! Failed with error code -13!"), std::u16string::npos);
+    }
+}
+
+TEST_F(ServerTest, SecondServerForTheSameInstanceGivesUp)
+{
+    auto first = Start({"--portname", "P"}, "P");
+    testsupport::SorvikProcess second(SORVIK_SERVER, {"--portname", "P"});
+    EXPECT_EQ(second.Wait(), 1);
+    AccessRef access{CreateDirectStoreAccess(u"P", 0)};
+    EXPECT_EQ(access->GetElementCount(8), 0u) << "the first one still serves";
+}
+
+class StoppedCallback final : public IServerStoppedCallback
+{
+public:
+    HRESULT QueryInterface(REFIID, void **object) override
+    {
+        *object = nullptr;
+        return E_NOINTERFACE;
+    }
+    ULONG AddRef() override { return ++m_refs; }
+    ULONG Release() override { return --m_refs; }
+    void OnServerStopped() override
+    {
+        std::lock_guard lock(m_lock);
+        ++m_calls;
+        m_called.notify_all();
+    }
+    bool WaitForCalls(int calls, std::chrono::milliseconds limit)
+    {
+        std::unique_lock lock(m_lock);
+        return m_called.wait_for(lock, limit, [&] { return m_calls >= calls; });
+    }
+
+private:
+    std::atomic<ULONG> m_refs{1};
+    std::mutex m_lock;
+    std::condition_variable m_called;
+    int m_calls = 0;
+};
+
+TEST_F(ServerTest, StopWaitCallbacksFireWhenTheServerIsKilled)
+{
+    auto server = Start({"--portname", "P"}, "P");
+    StoppedCallback callback;
+    AccessRef first{CreateDirectStoreAccess(u"P", 0)};
+    AccessRef second{CreateDirectStoreAccess(u"P", 0)};
+    first->StartStopWaitThread(&callback);
+    second->StartStopWaitThread(&callback);
+    EXPECT_FALSE(callback.WaitForCalls(1, std::chrono::milliseconds(200)));
+
+    server->Stop(SIGKILL);
+    EXPECT_TRUE(callback.WaitForCalls(2, std::chrono::seconds(10)));
+}
+
+TEST_F(ServerTest, LocalServerIsStartedWhenItDoesNotRunAndOnlyThen)
+{
+    cv::util::file::log::ILogImp log;
+    {
+        PLUGIN::Config forbidden(u"<server>localhost</server><startengine>no</startengine>");
+        RequestorBase requestor(forbidden, log);
+        EXPECT_FALSE(requestor.StartServerIfNeeded());
+    }
+    PLUGIN::Config config(u"<server>localhost</server>");
+    RequestorBase requestor(config, log);
+    ASSERT_TRUE(requestor.StartServerIfNeeded());
+    ASSERT_TRUE(WaitFor([] { return MutexHeld(kGlobalServerMutexName); })) << "the started server took its mutex";
+    const pid_t pid = StartedServerPid();
+    ASSERT_GT(pid, 0);
+
+    RequestorBase another(config, log);
+    EXPECT_FALSE(another.StartServerIfNeeded()) << "a server holds the global mutex";
+    cv::vek::rovo::tRequestTransferData request(config.GetServerVersion(), 5, 4002);
+    request.Arguments()[2] = 8;
+    EXPECT_EQ(cv::vek::rovo::tResponseTransferData(another.Exchange(5000, request)).Value(), 0u);
+
+    ::kill(pid, SIGTERM);
+    EXPECT_TRUE(WaitFor([] { return !MutexHeld(kGlobalServerMutexName); }));
+}
+
+} // namespace

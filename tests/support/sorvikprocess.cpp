@@ -1,0 +1,85 @@
+#include "support/sorvikprocess.h"
+
+#include <signal.h>
+#include <spawn.h>
+#include <sys/wait.h>
+
+#include <cstdlib>
+#include <stdexcept>
+#include <thread>
+
+extern char **environ;
+
+namespace testsupport {
+
+SorvikProcess::SorvikProcess(const std::string &program, const std::vector<std::string> &arguments)
+{
+    std::vector<char *> argv;
+    argv.push_back(const_cast<char *>(program.c_str()));
+    for (const std::string &argument : arguments)
+        argv.push_back(const_cast<char *>(argument.c_str()));
+    argv.push_back(nullptr);
+    if (posix_spawn(&m_pid, program.c_str(), nullptr, nullptr, argv.data(), environ) != 0)
+        throw std::runtime_error("cannot start " + program);
+}
+
+SorvikProcess::~SorvikProcess()
+{
+    if (m_pid > 0)
+        Stop(SIGKILL);
+}
+
+std::filesystem::path SorvikProcess::SocketOf(const std::string &portName)
+{
+    const char *runtime = std::getenv("CORVANE_RUNTIME_DIR");
+    const std::filesystem::path root = runtime && *runtime ? runtime : "/tmp/corvane-run";
+    if (portName.empty())
+        return root / "VEK_INDEX_SERVICE_SEARCH_BROWSE" / "VEK_INDEX_SERVICE.sock";
+    return root / "VEK_INDEX_SERVICE_SERVER" / (portName + ".sock");
+}
+
+bool SorvikProcess::WaitUntilServing(const std::string &portName, std::chrono::milliseconds within)
+{
+    const auto deadline = std::chrono::steady_clock::now() + within;
+    while (std::chrono::steady_clock::now() < deadline) {
+        if (std::filesystem::exists(SocketOf(portName)))
+            return true;
+        int status = 0;
+        if (m_pid > 0 && ::waitpid(m_pid, &status, WNOHANG) == m_pid) {
+            m_pid = -1;
+            return false;
+        }
+        std::this_thread::sleep_for(std::chrono::milliseconds(10));
+    }
+    return false;
+}
+
+int SorvikProcess::Stop(int signal, std::chrono::milliseconds within)
+{
+    if (m_pid <= 0)
+        return -1;
+    ::kill(m_pid, signal);
+    return Wait(within);
+}
+
+int SorvikProcess::Wait(std::chrono::milliseconds within)
+{
+    const auto deadline = std::chrono::steady_clock::now() + within;
+    while (m_pid > 0) {
+        int status = 0;
+        if (::waitpid(m_pid, &status, WNOHANG) == m_pid) {
+            m_pid = -1;
+            return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
+        }
+        if (std::chrono::steady_clock::now() >= deadline) {
+            ::kill(m_pid, SIGKILL);
+            ::waitpid(m_pid, &status, 0);
+            m_pid = -1;
+            return -1;
+        }
+        std::this_thread::sleep_for(std::chrono::milliseconds(5));
+    }
+    return -1;
+}
+
+} // namespace testsupport
