@@ -1,6 +1,10 @@
 #include "reference/server/indexstatus.h"
 
 #include <QDir>
+#include <QFile>
+
+#include <sys/inotify.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <limits>
@@ -30,14 +34,56 @@ IndexStatus::IndexStatus(const QString &indexFolder)
     m_db.Exec("CREATE TABLE IF NOT EXISTS element_counts(kind INTEGER PRIMARY KEY, count INTEGER NOT NULL)");
     m_db.Exec("CREATE TABLE IF NOT EXISTS counters(name TEXT PRIMARY KEY, value INTEGER NOT NULL)");
     m_db.Exec("CREATE TABLE IF NOT EXISTS parselet_timeouts(parselet TEXT PRIMARY KEY, count INTEGER NOT NULL)");
+
+    m_changes = ::inotify_init1(IN_NONBLOCK | IN_CLOEXEC);
+    if (m_changes >= 0 &&
+        ::inotify_add_watch(m_changes, QFile::encodeName(indexFolder).constData(),
+                            IN_MODIFY | IN_CREATE | IN_DELETE | IN_MOVED_TO | IN_MOVED_FROM) < 0) {
+        ::close(m_changes);
+        m_changes = -1;
+    }
+}
+
+IndexStatus::~IndexStatus()
+{
+    if (m_changes >= 0)
+        ::close(m_changes);
+}
+
+// True when the status file or its write-ahead log was written since the
+// last call, or when that cannot be told. Readers touch only the shared
+// memory file, so the server's own queries do not count.
+bool IndexStatus::FolderChanged()
+{
+    if (m_changes < 0)
+        return true;
+    bool changed = false;
+    alignas(inotify_event) char events[4096];
+    ssize_t got;
+    while ((got = ::read(m_changes, events, sizeof events)) > 0) {
+        for (ssize_t at = 0; at < got;) {
+            const auto *event = reinterpret_cast<const inotify_event *>(events + at);
+            const std::string_view name = event->len ? std::string_view(event->name) : std::string_view();
+            if (event->mask & IN_Q_OVERFLOW || name == "status.sqlite" || name == "status.sqlite-wal")
+                changed = true;
+            at += ssize_t(sizeof(inotify_event) + event->len);
+        }
+    }
+    return changed;
 }
 
 std::uint32_t IndexStatus::ElementCount(std::uint32_t kind)
 {
     std::lock_guard lock(m_lock);
-    rovo::Statement query(m_db, "SELECT count FROM element_counts WHERE kind = ?1");
-    query.Bind(1, std::int64_t(kind));
-    return query.Step() ? Clamped(query.Int(0)) : 0;
+    if (FolderChanged() || !m_elementCountsValid) {
+        m_elementCounts.clear();
+        rovo::Statement query(m_db, "SELECT kind, count FROM element_counts");
+        while (query.Step())
+            m_elementCounts[std::uint32_t(query.Int(0))] = Clamped(query.Int(1));
+        m_elementCountsValid = true;
+    }
+    const auto found = m_elementCounts.find(kind);
+    return found == m_elementCounts.end() ? 0 : found->second;
 }
 
 std::uint32_t IndexStatus::Counter(const char *name)

@@ -7,6 +7,7 @@
 #include <cstdint>
 #include <mutex>
 #include <string>
+#include <unordered_map>
 
 namespace sorvik::server {
 
@@ -22,6 +23,7 @@ public:
     // Opens or creates the status file in indexFolder, creating the folder.
     // Raises ref::Failure when it cannot.
     explicit IndexStatus(const QString &indexFolder);
+    ~IndexStatus();
 
     static QString FileIn(const QString &indexFolder);
 
@@ -40,11 +42,18 @@ public:
     void ResetNotMyFile();
 
 private:
+    bool FolderChanged();
     std::uint32_t Counter(const char *name);
     void SetCounter(const char *name, std::int64_t value);
 
     std::mutex m_lock;
     rovo::Db m_db;
+    // Element counts are asked for far more often than they change: they are
+    // kept in memory until a file of the index folder is written to.
+    std::unordered_map<std::uint32_t, std::uint32_t> m_elementCounts;
+    bool m_elementCountsValid = false;
+    int m_changes = -1; // inotify on the index folder
+
 };
 
 } // namespace sorvik::server

@@ -1,0 +1,139 @@
+// One GetElementCount through direct store access, requestor, comm library
+// and the reference server process, beside a raw Unix-domain socket
+// ping-pong with another process using frames of the same sizes.
+
+#include "dunemere/directstoreaccess.h"
+#include "dunemere/requesttransferdata.h"
+#include "dunemere/responsetransferdata.h"
+#include "support/sorvikprocess.h"
+
+#include <benchmark/benchmark.h>
+
+#include <sys/socket.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cstdlib>
+#include <filesystem>
+#include <memory>
+#include <vector>
+
+namespace {
+
+using namespace cv::vek::rovo;
+
+std::filesystem::path MakeScratch()
+{
+    char pattern[] = "/tmp/sorvik-bench-XXXXXX";
+    const char *made = ::mkdtemp(pattern);
+    if (!made)
+        std::abort();
+    return made;
+}
+
+// The private folders and the running server, for the whole run.
+struct Setting
+{
+    Setting() : scratch(MakeScratch())
+    {
+        ::setenv("CORVANE_REGISTRY", SORVIK_REFERENCE_REGISTRY, 1);
+        ::setenv("CORVANE_SORVIK_STORE", (scratch / "store").c_str(), 1);
+        ::setenv("CORVANE_RUNTIME_DIR", (scratch / "run").c_str(), 1);
+        ::setenv("CORVANE_MUTEX_DIR", (scratch / "mutex").c_str(), 1);
+        server = std::make_unique<testsupport::SorvikProcess>(SORVIK_SERVER, std::vector<std::string>{"--portname", "Bench"});
+        if (!server->WaitUntilServing("Bench"))
+            std::abort();
+    }
+    ~Setting()
+    {
+        server.reset();
+        std::filesystem::remove_all(scratch);
+    }
+
+    std::filesystem::path scratch;
+    std::unique_ptr<testsupport::SorvikProcess> server;
+};
+
+Setting &Shared()
+{
+    static Setting setting;
+    return setting;
+}
+
+void GetElementCount_DirectStoreAccess(benchmark::State &state)
+{
+    Shared();
+    auto *access = dunemere::CreateDirectStoreAccess(u"Bench", 0);
+    if (access->GetElementCount(8) == dunemere::IDirectStoreAccess::kFailure) {
+        state.SkipWithError("the reference server does not answer");
+        access->Release();
+        return;
+    }
+    for (auto _ : state)
+        benchmark::DoNotOptimize(access->GetElementCount(8));
+    access->Release();
+}
+
+// The same path without the server's status store.
+void GetUserCount_DirectStoreAccess(benchmark::State &state)
+{
+    Shared();
+    auto *access = dunemere::CreateDirectStoreAccess(u"Bench", 0);
+    for (auto _ : state)
+        benchmark::DoNotOptimize(access->GetUserCount(0));
+    access->Release();
+}
+
+bool Transfer(int fd, std::uint8_t *bytes, std::size_t size, bool write)
+{
+    std::size_t done = 0;
+    while (done < size) {
+        const ssize_t n = write ? ::send(fd, bytes + done, size - done, MSG_NOSIGNAL) : ::read(fd, bytes + done, size - done);
+        if (n <= 0)
+            return false;
+        done += std::size_t(n);
+    }
+    return true;
+}
+
+void RawSocketPingPong(benchmark::State &state)
+{
+    // Frame sizes: the record and its four-byte length.
+    const tRequestTransferData request(kClientVersion, 5, 4002);
+    cv::krn::ByteBuffer record;
+    request.Serialize(record);
+    const std::size_t requestSize = 4 + record.size();
+    record.clear();
+    tResponseTransferData(request.RequestIdentifier(), 0, 0).Serialize(record);
+    const std::size_t responseSize = 4 + record.size();
+
+    int pair[2];
+    if (::socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, pair) != 0) {
+        state.SkipWithError("no socket pair");
+        return;
+    }
+    const pid_t child = ::fork();
+    if (child == 0) {
+        ::close(pair[0]);
+        std::vector<std::uint8_t> in(requestSize), out(responseSize);
+        while (Transfer(pair[1], in.data(), in.size(), false) && Transfer(pair[1], out.data(), out.size(), true)) {
+        }
+        ::_exit(0);
+    }
+    ::close(pair[1]);
+    std::vector<std::uint8_t> out(requestSize), in(responseSize);
+    for (auto _ : state) {
+        Transfer(pair[0], out.data(), out.size(), true);
+        Transfer(pair[0], in.data(), in.size(), false);
+    }
+    ::close(pair[0]);
+    ::waitpid(child, nullptr, 0);
+}
+
+BENCHMARK(GetElementCount_DirectStoreAccess)->Repetitions(9)->ReportAggregatesOnly(true)->UseRealTime();
+BENCHMARK(GetUserCount_DirectStoreAccess)->Repetitions(9)->ReportAggregatesOnly(true)->UseRealTime();
+BENCHMARK(RawSocketPingPong)->Repetitions(9)->ReportAggregatesOnly(true)->UseRealTime();
+
+} // namespace
+
+BENCHMARK_MAIN();
