@@ -30,7 +30,6 @@ constexpr std::uint32_t kVerbosity = 5;
 constexpr std::uint32_t kStartVerbosity = 2;
 constexpr int kCallsPerTransfer = 5;
 
-constexpr std::int32_t kStatusAccepted = 0;
 constexpr std::int32_t kStatusLoggedOn = 1;
 constexpr std::int32_t kStatusAuthenticationRequired = 2;
 constexpr std::int32_t kStatusAuthenticationContinues = 3;
