@@ -45,7 +45,7 @@ public:
             }
         }
         if (step.kind == Step::Kind::Failed)
-            std::fprintf(stderr, "Sorvik: Kerberos log-on refused: %s\n", step.error.c_str());
+            std::fprintf(stderr, "Sorvik: %s\n", step.error.c_str());
         return step;
     }
 

@@ -110,6 +110,8 @@ bool ProtocolSession::ClientProofValid(const tRequestTransferData &request) cons
 
 void ProtocolSession::SetLoggedOn(std::u16string clientName)
 {
+    if (m_context.onLoggedOn)
+        m_context.onLoggedOn(clientName);
     m_awaitingAuthentication = false;
     m_acceptor.reset();
     m_clientName = std::move(clientName);
@@ -129,7 +131,8 @@ ByteBuffer ProtocolSession::Permission(const tRequestTransferData &request)
     if (options.RequiresAuthentication()) {
         m_awaitingAuthentication = true;
         m_acceptor.reset();
-        return DataResponse(id, kStatusAuthenticationRequired, 0, options.principal);
+        return DataResponse(id, kStatusAuthenticationRequired, 0,
+                            options.clientTarget.empty() ? options.principal : options.clientTarget);
     }
     SetLoggedOn({});
     return DataResponse(id, kStatusAccepted);
@@ -168,6 +171,10 @@ ByteBuffer ProtocolSession::Authentication(const CAuthenticationRequestTransferD
     }
     m_awaitingAuthentication = false;
     m_acceptor.reset();
+    // An error token tells the client what went wrong; its next step fails
+    // on it, and anything it sends after that is refused.
+    if (!step.token.empty())
+        return AuthenticationResponse(id, kStatusAuthenticationContinues, step.token);
     return AuthenticationResponse(id, kStatusClientRefused, {});
 }
 

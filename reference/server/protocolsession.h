@@ -38,6 +38,8 @@ struct ServerContext
     std::atomic<std::uint32_t> &loggedOnUsers;
     // Makes a Kerberos acceptor; empty when the server has no keytab.
     std::function<std::unique_ptr<ILogOnAcceptor>()> makeKerberosAcceptor;
+    // Told the name of each client that logs on (empty without log-on client).
+    std::function<void(const std::u16string &clientName)> onLoggedOn = {};
 };
 
 // The protocol state of one client connection: log-on, then requests. It

@@ -10,6 +10,9 @@
 #include "reference/server/protocolsession.h"
 #include "reference/server/storeconfiguration.h"
 
+#include <QString>
+
+#include <cstdio>
 #include <list>
 #include <mutex>
 #include <stdexcept>
@@ -48,6 +51,15 @@ void Serve(FramedSocket &socket, ServerContext &context, const std::atomic<bool>
         if (!response || socket.Send(response->bytes(), cv::vek::rovo::comm::kInfinite) != kResultOk)
             return;
     }
+}
+
+// One line per log-on on standard output, for whoever runs the server.
+void AnnounceLogOn(const std::u16string &clientName)
+{
+    static std::mutex lock;
+    std::lock_guard guard(lock);
+    std::printf("logged on: %s\n", clientName.empty() ? "(anonymous)" : QString::fromStdU16String(clientName).toUtf8().constData());
+    std::fflush(stdout);
 }
 
 } // namespace
@@ -93,7 +105,8 @@ Server::~Server() = default;
 void Server::Run(const std::atomic<bool> &stop)
 {
     State &state = *m_state;
-    ServerContext context{state.options, *state.status, state.loggedOnUsers, state.makeKerberosAcceptor};
+    ServerContext context{state.options, *state.status, state.loggedOnUsers, state.makeKerberosAcceptor,
+                          &AnnounceLogOn};
 
     struct Connection
     {

@@ -69,7 +69,8 @@ std::optional<ServerOptions> ParseServerOptions(int argc, char **argv, std::stri
             continue;
         }
         if (option != "--portname" && option != "--version" && option != "--identification" &&
-            option != "--secretkey" && option != "--keytab" && option != "--principal" && option != "--store") {
+            option != "--secretkey" && option != "--keytab" && option != "--principal" && option != "--store" &&
+            option != "--client-target") {
             error = "unknown option " + std::string(option);
             return std::nullopt;
         }
@@ -93,6 +94,8 @@ std::optional<ServerOptions> ParseServerOptions(int argc, char **argv, std::stri
             options.keytab = std::string(*text);
         } else if (option == "--principal") {
             options.principal = Utf16(*text);
+        } else if (option == "--client-target") {
+            options.clientTarget = Utf16(*text);
         } else {
             options.store = std::string(*text);
         }

@@ -10,6 +10,7 @@ namespace sorvik::server {
 //   Sorvik [--portname NAME] [--version MAJOR.MINOR.PATCH]
 //          [--identification TEXT --secretkey KEY]
 //          [--keytab FILE --principal NAME] [--require-authentication]
+//          [--client-target NAME] [--skip-mutual-authentication]
 //          [--store DIR]
 struct ServerOptions
 {
@@ -23,6 +24,9 @@ struct ServerOptions
     // Kerberos log-on: the keytab and the principal clients are to target.
     std::string keytab;
     std::u16string principal;
+    // For tests of the client: the principal clients are told to target,
+    // when it is to differ from the one the server accepts for.
+    std::u16string clientTarget;
     // Ask for authentication even without a keytab (SID log-ons only).
     bool requireAuthentication = false;
     // For tests of the client: completes a Kerberos log-on without returning

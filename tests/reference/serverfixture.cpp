@@ -70,9 +70,10 @@ ServerTest::ServerTest()
 }
 
 std::unique_ptr<testsupport::SorvikProcess> ServerTest::Start(const std::vector<std::string> &arguments,
-                                                              const std::string &portName)
+                                                              const std::string &portName,
+                                                              const std::filesystem::path &output)
 {
-    auto server = std::make_unique<testsupport::SorvikProcess>(SORVIK_SERVER, arguments);
+    auto server = std::make_unique<testsupport::SorvikProcess>(SORVIK_SERVER, arguments, output);
     if (!server->WaitUntilServing(portName))
         ADD_FAILURE() << "the server did not come up";
     return server;

@@ -22,7 +22,8 @@ protected:
     ServerTest();
 
     std::unique_ptr<testsupport::SorvikProcess> Start(const std::vector<std::string> &arguments,
-                                                      const std::string &portName);
+                                                      const std::string &portName,
+                                                      const std::filesystem::path &output = {});
     // The index status file of a running instance's Sorvik.
     std::filesystem::path StatusFile() const;
     void Sql(const std::string &statement) const;

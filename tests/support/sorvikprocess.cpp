@@ -1,5 +1,6 @@
 #include "support/sorvikprocess.h"
 
+#include <fcntl.h>
 #include <signal.h>
 #include <spawn.h>
 #include <sys/wait.h>
@@ -12,14 +13,21 @@ extern char **environ;
 
 namespace testsupport {
 
-SorvikProcess::SorvikProcess(const std::string &program, const std::vector<std::string> &arguments)
+SorvikProcess::SorvikProcess(const std::string &program, const std::vector<std::string> &arguments,
+                             const std::filesystem::path &output)
 {
     std::vector<char *> argv;
     argv.push_back(const_cast<char *>(program.c_str()));
     for (const std::string &argument : arguments)
         argv.push_back(const_cast<char *>(argument.c_str()));
     argv.push_back(nullptr);
-    if (posix_spawn(&m_pid, program.c_str(), nullptr, nullptr, argv.data(), environ) != 0)
+    posix_spawn_file_actions_t actions;
+    posix_spawn_file_actions_init(&actions);
+    if (!output.empty())
+        posix_spawn_file_actions_addopen(&actions, 1, output.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0644);
+    const int failed = posix_spawn(&m_pid, program.c_str(), &actions, nullptr, argv.data(), environ);
+    posix_spawn_file_actions_destroy(&actions);
+    if (failed)
         throw std::runtime_error("cannot start " + program);
 }
 

@@ -15,7 +15,9 @@ namespace testsupport {
 class SorvikProcess final
 {
 public:
-    SorvikProcess(const std::string &program, const std::vector<std::string> &arguments);
+    // With an output file, the process's standard output goes there.
+    SorvikProcess(const std::string &program, const std::vector<std::string> &arguments,
+                  const std::filesystem::path &output = {});
     ~SorvikProcess();
 
     SorvikProcess(const SorvikProcess &) = delete;
