@@ -16,6 +16,7 @@
 #include <signal.h>
 
 #include <condition_variable>
+#include <fstream>
 #include <mutex>
 #include <thread>
 
@@ -214,6 +215,48 @@ TEST_F(ServerTest, LocalServerIsStartedWhenItDoesNotRunAndOnlyThen)
 
     ::kill(pid, SIGTERM);
     EXPECT_TRUE(WaitFor([] { return !MutexHeld(kGlobalServerMutexName); }));
+}
+
+std::string FileText(const std::filesystem::path &file)
+{
+    std::ifstream in(file);
+    return std::string(std::istreambuf_iterator<char>(in), {});
+}
+
+TEST_F(ServerTest, StatsCommandPrintsEveryStatisticAndWaitsForTheEnd)
+{
+    auto server = Start({"--portname", "S"}, "S");
+    Sql("INSERT INTO element_counts VALUES (8, 120); INSERT INTO parselet_timeouts VALUES ('CSV', 3)");
+
+    testsupport::SorvikProcess stats(SORVIK_HOST, {"stats", "--portname", "S"}, m_dir.file("stats.out"));
+    EXPECT_EQ(stats.Wait(std::chrono::seconds(30)), 0);
+    EXPECT_EQ(FileText(m_dir.file("stats.out")), "GetUserCount(0): 1\n"
+                                                 "GetElementCount(8): 120\n"
+                                                 "GetElementCount(16): 0\n"
+                                                 "GetElementCount(32): 0\n"
+                                                 "GetDiskIsFullCrawlStop: false\n"
+                                                 "GetFileviewsTimeouted: 3\n"
+                                                 "GetFileviewsTimeoutedPerPlugIn: 1\n"
+                                                 "GetFileviewsTimeoutedPerPlugIn(CSV): 3\n");
+
+    testsupport::SorvikProcess waiting(SORVIK_HOST, {"stats", "--portname", "S", "--wait"}, m_dir.file("wait.out"));
+    ASSERT_TRUE(WaitFor([&] { return FileText(m_dir.file("wait.out")).find("PerPlugIn(CSV)") != std::string::npos; },
+                        std::chrono::seconds(30)));
+    EXPECT_EQ(waiting.Wait(std::chrono::milliseconds(300)), -1) << "it waits while the server runs";
+}
+
+TEST_F(ServerTest, StatsCommandEndsWhenTheServerDoes)
+{
+    auto server = Start({"--portname", "S"}, "S");
+    testsupport::SorvikProcess waiting(SORVIK_HOST, {"stats", "--portname", "S", "--wait"}, m_dir.file("wait.out"));
+    ASSERT_TRUE(WaitFor([&] { return FileText(m_dir.file("wait.out")).find("PerPlugIn") != std::string::npos; },
+                        std::chrono::seconds(30)));
+    server->Stop(SIGTERM);
+    EXPECT_EQ(waiting.Wait(std::chrono::seconds(10)), 0);
+    EXPECT_NE(FileText(m_dir.file("wait.out")).find("stopped: S"), std::string::npos);
+
+    testsupport::SorvikProcess unanswered(SORVIK_HOST, {"stats", "--portname", "S"});
+    EXPECT_EQ(unanswered.Wait(std::chrono::seconds(30)), 3) << "nobody answers any more";
 }
 
 } // namespace
