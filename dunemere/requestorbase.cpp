@@ -11,11 +11,10 @@
 #include "dunemere/tointmsgda.h"
 #include "krn/exception/exception.h"
 #include "krn/osdep/mutex.h"
+#include "krn/osdep/process.h"
+#include "krn/utf.h"
 #include "log/ilog.h"
 #include "sorvik/packedversion.h"
-
-#include <QProcess>
-#include <QString>
 
 #include <chrono>
 #include <string>
@@ -181,8 +180,7 @@ bool RequestorBase::StartServerIfNeeded()
     }
 
     m_log.Info(__FILE__, __LINE__, kStartVerbosity) << "SKCP:     Sorvik is not running so we try to start it!";
-    const std::u16string path = dunemere::ServerExecutablePath();
-    if (!QProcess::startDetached(QString::fromUtf16(path.data(), qsizetype(path.size())), {}))
+    if (!krn::osdep::StartDetachedProcess(krn::ToUtf8(dunemere::ServerExecutablePath())))
         throw DataCache::ToIntMsgDa(kSource, 65,
                                     u"PLUGIN: Sorvik is not running and the plugin is not able to start it!");
     m_serverStartedAt = std::chrono::steady_clock::now();
