@@ -250,6 +250,37 @@ TEST_F(RequestorTest, LostLogOnIsRestoredOnceAndTheRequestSentAgainWithANewIdent
     EXPECT_THAT(Utf8(error.Message()), HasSubstr("Failed with error code -65536!")) << "one re-log-on only";
 }
 
+TEST_F(RequestorTest, ConnectionLostWhileWaitingForTheAnswer)
+{
+    ScriptedServer server(u"P", [](const ScriptedServer::Request &request, ScriptedServer::Peer &peer) {
+        if (request.category == 4)
+            peer.Send(ScriptedServer::Data(request.id, 0));
+        else
+            peer.Drop();
+    });
+    RequestorBase requestor(Settings(), m_log);
+
+    const auto error = ErrorOf([&] { Ask(requestor); });
+    EXPECT_EQ(error.Code(), 65u);
+    EXPECT_THAT(Utf8(error.Message()), HasSubstr("): Sorvik is no longer connected."));
+    EXPECT_FALSE(requestor.IsConnected());
+}
+
+TEST_F(RequestorTest, BareErrorCodeDuringLogOnBecomesPermissionDenied)
+{
+    ScriptedServer server(u"P", [](const ScriptedServer::Request &request, ScriptedServer::Peer &peer) {
+        peer.Send(ScriptedServer::Data(request.id, 2, 0, u"svc@localhost"));
+    });
+    RequestorBase requestor(Settings(), m_log, [](const PLUGIN::IConfig &) -> PLUGIN::IKerberosClient * {
+        throw DataCache::cErrCodeDa(77);
+    });
+
+    const auto error = ErrorOf([&] { requestor.Connect(false, 3); });
+    EXPECT_EQ(error.Code(), 77u);
+    EXPECT_THAT(Utf8(error.Message()), HasSubstr("ERROR(77): Permission denied!"));
+    EXPECT_FALSE(requestor.IsConnected());
+}
+
 TEST_F(RequestorTest, ShutdownRequestIsNotAnswered)
 {
     ScriptedServer server(u"P", ScriptedServer::Serving(k18, [](const auto &) { return 0u; }));

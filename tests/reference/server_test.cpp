@@ -217,6 +217,24 @@ TEST_F(ServerTest, LocalServerIsStartedWhenItDoesNotRunAndOnlyThen)
     EXPECT_TRUE(WaitFor([] { return !MutexHeld(kGlobalServerMutexName); }));
 }
 
+TEST_F(ServerTest, LocalServerThatCannotBeStartedIsReported)
+{
+    std::ofstream(m_dir.file("registry.ini")) << "[Software\\Corvane\\Common\\SorvikDesktop]\nbinDir="
+                                              << m_dir.file("nothing-here").string() << "\n";
+    testsupport::ScopedEnv registry("CORVANE_REGISTRY", m_dir.file("registry.ini").string());
+    cv::util::file::log::ILogImp log;
+    PLUGIN::Config config(u"<server>localhost</server>");
+    RequestorBase requestor(config, log);
+    try {
+        requestor.StartServerIfNeeded();
+        ADD_FAILURE() << "started";
+    } catch (const DataCache::ToIntMsgDa &error) {
+        EXPECT_EQ(error.Code(), 65u);
+        EXPECT_NE(error.Message().find(u"PLUGIN: Sorvik is not running and the plugin is not able to start it!"),
+                  std::u16string::npos);
+    }
+}
+
 std::string FileText(const std::filesystem::path &file)
 {
     std::ifstream in(file);
