@@ -5,6 +5,7 @@
 #include "dunemere/stopwaitthread.h"
 #include "sorvik/packedversion.h"
 #include "sorvik/vekexception.h"
+#include "support/directstoreaccessref.h"
 #include "support/scriptedserver.h"
 
 #include <gtest/gtest.h>
@@ -19,19 +20,13 @@ namespace {
 
 using namespace cv::vek::rovo::dunemere;
 using sorvik::PackVersion;
+using testsupport::AccessRef;
 using testsupport::ScriptedServer;
+using testsupport::StoppedCallback;
 
 [[maybe_unused]] const bool g_registry = (testsupport::InstallCommRegistry(), true);
 
 constexpr std::uint32_t kFailure = IDirectStoreAccess::kFailure;
-
-// Holds the one reference a creation function hands out.
-struct AccessRef
-{
-    IDirectStoreAccess *access;
-    ~AccessRef() { access->Release(); }
-    IDirectStoreAccess *operator->() const { return access; }
-};
 
 std::set<std::uint32_t> CodesReceived(const ScriptedServer &server)
 {
@@ -177,43 +172,6 @@ TEST(DirectStoreAccessSettings, SettingsTextNamesTheLocalInstanceAndTheIdentific
               u"<server>localhost</server><portname>P1</portname><clientidentificationstring>id"
               u"</clientidentificationstring><clientidentificationsecretkey>k</clientidentificationsecretkey>");
 }
-
-// Counts its notifications; lives on the stack of the test.
-class StoppedCallback final : public IServerStoppedCallback
-{
-public:
-    HRESULT QueryInterface(REFIID, void **object) override
-    {
-        *object = nullptr;
-        return E_NOINTERFACE;
-    }
-    ULONG AddRef() override { return ++m_refs; }
-    ULONG Release() override { return --m_refs; }
-    void OnServerStopped() override
-    {
-        std::lock_guard lock(m_lock);
-        ++m_calls;
-        m_called.notify_all();
-    }
-
-    bool WaitForCalls(int calls, std::chrono::milliseconds limit)
-    {
-        std::unique_lock lock(m_lock);
-        return m_called.wait_for(lock, limit, [&] { return m_calls >= calls; });
-    }
-    int Calls()
-    {
-        std::lock_guard lock(m_lock);
-        return m_calls;
-    }
-    ULONG References() const { return m_refs.load(); }
-
-private:
-    std::atomic<ULONG> m_refs{1};
-    std::mutex m_lock;
-    std::condition_variable m_called;
-    int m_calls = 0;
-};
 
 TEST_F(DirectStoreAccessTest, StopWaitThreadCallsBackWhenTheInstanceEndsAndHoldsItsCallback)
 {

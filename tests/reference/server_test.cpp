@@ -1,5 +1,7 @@
 #include "serverfixture.h"
 
+#include "support/directstoreaccessref.h"
+
 #include "dunemere/config.h"
 #include "dunemere/directstoreaccess.h"
 #include "dunemere/instancenames.h"
@@ -25,17 +27,11 @@ namespace {
 using namespace cv::vek::rovo::dunemere;
 using cv::vek::rovo::RequestorBase;
 using reftest::ServerTest;
+using testsupport::AccessRef;
+using testsupport::StoppedCallback;
 using sorvik::PackVersion;
 
 [[maybe_unused]] const bool g_registry = (reftest::InstallServerRegistry(), true);
-
-struct AccessRef
-{
-    IDirectStoreAccess *access;
-    ~AccessRef() { access->Release(); }
-    IDirectStoreAccess *operator->() const { return access; }
-    std::uint32_t Version() const { return static_cast<CDirectStoreAccess *>(access)->Settings().GetServerVersion(); }
-};
 
 bool MutexHeld(std::u16string_view name)
 {
@@ -148,35 +144,6 @@ TEST_F(ServerTest, SecondServerForTheSameInstanceGivesUp)
     AccessRef access{CreateDirectStoreAccess(u"P", 0)};
     EXPECT_EQ(access->GetElementCount(8), 0u) << "the first one still serves";
 }
-
-class StoppedCallback final : public IServerStoppedCallback
-{
-public:
-    HRESULT QueryInterface(REFIID, void **object) override
-    {
-        *object = nullptr;
-        return E_NOINTERFACE;
-    }
-    ULONG AddRef() override { return ++m_refs; }
-    ULONG Release() override { return --m_refs; }
-    void OnServerStopped() override
-    {
-        std::lock_guard lock(m_lock);
-        ++m_calls;
-        m_called.notify_all();
-    }
-    bool WaitForCalls(int calls, std::chrono::milliseconds limit)
-    {
-        std::unique_lock lock(m_lock);
-        return m_called.wait_for(lock, limit, [&] { return m_calls >= calls; });
-    }
-
-private:
-    std::atomic<ULONG> m_refs{1};
-    std::mutex m_lock;
-    std::condition_variable m_called;
-    int m_calls = 0;
-};
 
 TEST_F(ServerTest, StopWaitCallbacksFireWhenTheServerIsKilled)
 {
