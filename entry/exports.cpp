@@ -1,9 +1,18 @@
 // The functions libServerDialogs.so exports; everything else stays hidden.
 
+#include "entry/dialoggallery.h"
 #include "entry/module.h"
 #include "entry/serverdialogsapp.h"
 #include "serverlibs/opensorvik.h"
+#include "resources/hostresources.h"
 #include "sorvik/serverdialogsexports.h"
+#include "sorvik/serverdialogsextras.h"
+
+#include <QByteArray>
+#include <QString>
+
+#include <map>
+#include <mutex>
 
 #include <utility>
 
@@ -88,6 +97,37 @@ HRESULT DllGetClassObject(REFCLSID, REFIID, void **object)
     if (object)
         *object = nullptr;
     return CLASS_E_CLASSNOTAVAILABLE;
+}
+
+const void *sorvikGetHostResource(const char *name, std::uint32_t *size)
+{
+    if (size)
+        *size = 0;
+    if (!name)
+        return nullptr;
+    // Kept for the module's life: the host holds on to the pointer.
+    static std::mutex lock;
+    static std::map<QString, QByteArray> loaded;
+    const std::lock_guard<std::mutex> guard(lock);
+    const QString key = QString::fromUtf8(name);
+    auto found = loaded.find(key);
+    if (found == loaded.end()) {
+        QByteArray bytes = resources::HostResource(key);
+        if (bytes.isEmpty())
+            return nullptr;
+        found = loaded.emplace(key, std::move(bytes)).first;
+    }
+    if (size)
+        *size = std::uint32_t(found->second.size());
+    return found->second.constData();
+}
+
+std::int32_t sorvikRenderDialogs(const char16_t *folder, const LOGFONTW *font)
+{
+    if (!folder || !TheApp().EnsureApplication())
+        return -1;
+    const QStringList written = RenderDialogGallery(QString::fromUtf16(folder), font);
+    return written.isEmpty() ? -1 : std::int32_t(written.size());
 }
 
 } // extern "C"

@@ -1,38 +1,84 @@
 #include "entry/serviceui.h"
 
-#include <QCursor>
-#include <QGuiApplication>
+#include "entry/serverdialogsapp.h"
+#include "pages/addsearchareadlg.h"
+#include "resources/strings.h"
+#include "sharedsource/prompts.h"
+#include "sharedsource/waitcursor.h"
+#include "sorvik/wstringqt.h"
 
 namespace cv::vek::rovo {
 
 namespace {
 
-class WindowlessServiceUi final : public IServiceUi
+using resources::LoadString;
+using resources::Str;
+using sharedsource::MessageButtons;
+using sharedsource::MessageIcon;
+using sharedsource::MessageResult;
+
+class CModuleServiceUi final : public IServiceUi
 {
 public:
+    // The properties, optimize and reset dialogs do not exist yet.
     std::int32_t RunConfigurationDialog(const krn::WString &, const HostSettings &) override
     {
         return kDialogNotCreated;
     }
     std::int32_t RunOptimizeDialog(const krn::WString &, const HostSettings &) override { return kDialogNotCreated; }
     std::int32_t RunResetDialog(cv::rovo::ISorvik &, const HostSettings &) override { return kDialogNotCreated; }
-    std::int32_t RunSearchAreaDialog(SearchAreaDialogData &, IInputTester &, const HostSettings &) override
-    {
-        return kDialogNotCreated;
-    }
-    bool ConfirmExcludeFolder(std::u16string_view) override { return false; }
-    bool ConfirmRemoveSearchArea(std::u16string_view) override { return false; }
-    void ReportUnknownError() override {}
 
-    void BeginWaitCursor() override
+    std::int32_t RunSearchAreaDialog(SearchAreaDialogData &data, IInputTester &tester,
+                                     const HostSettings &host) override
     {
-        if (qobject_cast<QGuiApplication *>(QCoreApplication::instance()))
-            QGuiApplication::setOverrideCursor(QCursor(Qt::WaitCursor));
+        if (!TheApp().EnsureApplication())
+            return kDialogNotCreated;
+        pages::CAddSearchAreaDlg dialog(krn::ToQString(data.alias), krn::ToQString(data.path),
+                                        krn::ToQString(data.clientPath), tester, data.editMode, host.helpCallback,
+                                        host.helpContext, host.fontSet ? &host.font : nullptr);
+        const std::int32_t result = dialog.DoModal();
+        if (result == kModalOk) {
+            data.alias = krn::FromQString(dialog.Name());
+            data.path = krn::FromQString(dialog.ServerPath());
+            data.clientPath = krn::FromQString(dialog.Path());
+        }
+        return result;
     }
-    void EndWaitCursor() override
+
+    bool ConfirmExcludeFolder(std::u16string_view path) override
     {
-        if (qobject_cast<QGuiApplication *>(QCoreApplication::instance()))
-            QGuiApplication::restoreOverrideCursor();
+        return Confirm(resources::FormatString(Str::ExcludeFolderQuestion, ToQString(path)));
+    }
+    bool ConfirmRemoveSearchArea(std::u16string_view path) override
+    {
+        return Confirm(resources::FormatString(Str::RemoveSearchAreaQuestion, ToQString(path)));
+    }
+    void ReportUnknownError() override
+    {
+        if (QApplication *app = TheApp().EnsureApplication())
+            sharedsource::QtPrompts().ShowMessage(
+                app->activeWindow(), {LoadString(Str::UnknownError), LoadString(Str::ServerError), MessageIcon::Error,
+                                      MessageButtons::Ok});
+    }
+
+    void BeginWaitCursor() override { sharedsource::BeginWaitCursor(); }
+    void EndWaitCursor() override { sharedsource::EndWaitCursor(); }
+
+private:
+    static QString ToQString(std::u16string_view text)
+    {
+        return QString::fromUtf16(text.data(), qsizetype(text.size()));
+    }
+
+    // Without a widget application nothing can be asked, and nothing changes unasked.
+    static bool Confirm(const QString &question)
+    {
+        QApplication *app = TheApp().EnsureApplication();
+        if (!app)
+            return false;
+        return sharedsource::QtPrompts().ShowMessage(app->activeWindow(),
+                                                     {question, LoadString(Str::Warning), MessageIcon::Warning,
+                                                      MessageButtons::OkCancel}) == MessageResult::Ok;
     }
 };
 
@@ -40,7 +86,7 @@ public:
 
 IServiceUi &ModuleServiceUi()
 {
-    static WindowlessServiceUi ui;
+    static CModuleServiceUi ui;
     return ui;
 }
 

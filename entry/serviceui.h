@@ -72,10 +72,11 @@ private:
     IServiceUi *m_ui;
 };
 
-// The user interface that service objects of this module use. Without
-// dialogs to show it reports every dialog as not created, answers every
-// question as not confirmed (no change happens without the user's OK) and
-// shows the wait cursor through Qt when a GUI application exists.
+// The user interface that service objects of this module use: the real
+// search-area dialog and questions, in the host's widget application or in
+// one the module creates. Dialogs that do not exist yet, and every dialog
+// when no widget application can exist, are reported as not created; a
+// question that cannot be asked counts as not confirmed.
 IServiceUi &ModuleServiceUi();
 
 } // namespace cv::vek::rovo

@@ -70,9 +70,6 @@ TEST_F(SearchAreaOperations, NothingChangesWithoutTheUsersOk)
     path = u"/nowhere";
     EXPECT_EQ(Service().RemoveSearchArea(path), CServerDialogs::kNotFound);
 
-    auto *windowless = new CServerDialogs(krn::WString(), 0, ModuleServiceUi(), serverlibs::ModuleSorvikOpener());
-    EXPECT_EQ(windowless->AddSearchAreaEx(path, 0), kDialogNotCreated);
-    windowless->Release();
     EXPECT_EQ(Snapshot(), (Lines{"/data | /data | Data", "  /data/tmp | tmp"}));
 }
 

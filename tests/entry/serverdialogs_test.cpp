@@ -103,15 +103,5 @@ TEST_F(ServiceObject, WithoutASorvikObjectSearchAreasRaise800AndResetReports)
     EXPECT_EQ(m_ui.calls, (std::vector<std::string>{"confirm exclude", "unknown error"}));
 }
 
-TEST(ModuleServiceUi, WithoutDialogsNothingOpensAndNothingIsConfirmed)
-{
-    auto *service = new CServerDialogs(krn::WString(), 0, ModuleServiceUi(), &NoSorvik);
-    EXPECT_EQ(service->ShowConfigurationDialog(), kDialogNotCreated);
-    EXPECT_EQ(service->ShowOptimizeDialog(), kDialogNotCreated);
-    krn::WString path(u"/data");
-    EXPECT_EQ(service->ExcludeFolder(path), CServerDialogs::kDeclined) << "declined before any server contact";
-    service->Release();
-}
-
 } // namespace
 } // namespace cv::vek::rovo

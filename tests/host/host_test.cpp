@@ -1,6 +1,7 @@
 // A host that knows the module only through the public headers and dlopen.
 
 #include "sorvik/serverdialogsexports.h"
+#include "sorvik/serverdialogsextras.h"
 #include "sorvik/vekexception.h"
 #include "support/scopedenv.h"
 #include "support/tempdir.h"
@@ -135,6 +136,25 @@ TEST_F(Host, ModuleExceptionsArriveAsTheSharedExceptionType)
     Cleanup();
     broken->Release();
     local->Release();
+}
+
+TEST_F(Host, FilesCarriedForTheHost)
+{
+    const auto get = Export<PFN_sorvikGetHostResource>("sorvikGetHostResource");
+    std::uint32_t size = 7;
+    EXPECT_EQ(get("../secret.xml", &size), nullptr);
+    EXPECT_EQ(size, 0u);
+    for (const char *name : {"unitcatalogue.xml", "queryproxy-files.xml", "queryproxy-measurements.xml"}) {
+        const auto *bytes = static_cast<const char *>(get(name, &size));
+        ASSERT_NE(bytes, nullptr) << name;
+        const std::string text(bytes, size);
+        EXPECT_EQ(text.rfind("<?xml", 0), 0u) << name;
+        EXPECT_EQ(get(name, nullptr), bytes) << "the same bytes for the module's life";
+    }
+    const auto *catalogue = static_cast<const char *>(get("unitcatalogue.xml", &size));
+    const std::string units(catalogue, size);
+    EXPECT_NE(units.find("<unit name=\"degC\" factor=\"1\" offset=\"273.15\"/>"), std::string::npos);
+    EXPECT_NE(units.find("<unitset name=\"SI\">"), std::string::npos);
 }
 
 } // namespace
