@@ -3,8 +3,8 @@
 #include "entry/dialoggallery.h"
 #include "entry/module.h"
 #include "entry/serverdialogsapp.h"
-#include "serverlibs/opensorvik.h"
 #include "resources/hostresources.h"
+#include "serverlibs/opensorvik.h"
 #include "sorvik/serverdialogsexports.h"
 #include "sorvik/serverdialogsextras.h"
 
