@@ -38,13 +38,21 @@ function(sorvik_add_gtest name)
   if(ARG_LABELS)
     list(APPEND properties LABELS "${ARG_LABELS}")
   endif()
-  if(ARG_ENVIRONMENT)
-    list(APPEND properties ENVIRONMENT "${ARG_ENVIRONMENT}")
-  endif()
   gtest_discover_tests(${name}
     DISCOVERY_MODE PRE_TEST
     DISCOVERY_TIMEOUT 60
     PROPERTIES ${properties})
+  # The discovered tests get their environment from a script CTest runs after
+  # discovery: handed through gtest_discover_tests, every variable after the
+  # first would be read as a property name.
+  if(ARG_ENVIRONMENT)
+    set(environment_script "${CMAKE_CURRENT_BINARY_DIR}/${name}_environment.cmake")
+    file(WRITE "${environment_script}"
+      "if(${name}_TESTS)\n"
+      "  set_tests_properties(\${${name}_TESTS} PROPERTIES ENVIRONMENT [==[${ARG_ENVIRONMENT}]==])\n"
+      "endif()\n")
+    set_property(DIRECTORY APPEND PROPERTY TEST_INCLUDE_FILES "${environment_script}")
+  endif()
 endfunction()
 
 # A libFuzzer target over LLVMFuzzerTestOneInput. In the fuzz build (clang,

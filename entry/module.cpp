@@ -8,8 +8,8 @@
 namespace cv::vek::rovo {
 
 ModuleLifetime::ModuleLifetime(serverlibs::VekexLibrary &vekex, serverlibs::RovoApiLibrary &rovoApi,
-                               OpenDialogList &dialogs)
-    : m_vekex(vekex), m_rovoApi(rovoApi), m_dialogs(dialogs)
+                               OpenDialogList &dialogs, CServerDialogsApp &app)
+    : m_vekex(vekex), m_rovoApi(rovoApi), m_dialogs(dialogs), m_app(app)
 {
 }
 
@@ -29,11 +29,12 @@ void ModuleLifetime::Cleanup()
     m_dialogs.CloseAll();
     m_vekex.ReleaseUse();
     m_rovoApi.ReleaseUse();
+    m_app.ExitInstance();
 }
 
 ModuleLifetime &Module()
 {
-    static ModuleLifetime module(serverlibs::Vekex(), serverlibs::RovoApi(), OpenDialogs());
+    static ModuleLifetime module(serverlibs::Vekex(), serverlibs::RovoApi(), OpenDialogs(), TheApp());
     return module;
 }
 

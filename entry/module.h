@@ -3,6 +3,7 @@
 // The module-wide start and end, and the logic behind the exported functions.
 
 #include "entry/opendialoglist.h"
+#include "entry/serverdialogsapp.h"
 #include "entry/serviceui.h"
 #include "entry/startcount.h"
 #include "serverlibs/rovoapilibrary.h"
@@ -18,13 +19,15 @@ namespace cv::vek::rovo {
 class ModuleLifetime final
 {
 public:
-    ModuleLifetime(serverlibs::VekexLibrary &vekex, serverlibs::RovoApiLibrary &rovoApi, OpenDialogList &dialogs);
+    ModuleLifetime(serverlibs::VekexLibrary &vekex, serverlibs::RovoApiLibrary &rovoApi, OpenDialogList &dialogs,
+                   CServerDialogsApp &app);
 
     // The first Init takes a use of the data-store library, then of the
     // server API library; whether they load shows only when they are called.
     void Init();
-    // The last Cleanup closes the open modeless windows and releases both
-    // libraries; a Cleanup without an Init does nothing.
+    // The last Cleanup closes the open modeless windows, releases both
+    // libraries and ends the application the module made for itself (never
+    // a host's); a Cleanup without an Init does nothing.
     void Cleanup();
 
     std::uint32_t Starts() const { return m_starts.Value(); }
@@ -33,6 +36,7 @@ private:
     serverlibs::VekexLibrary &m_vekex;
     serverlibs::RovoApiLibrary &m_rovoApi;
     OpenDialogList &m_dialogs;
+    CServerDialogsApp &m_app;
     StartCount m_starts;
 };
 

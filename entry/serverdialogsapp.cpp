@@ -6,7 +6,10 @@ CServerDialogsApp::CServerDialogsApp() = default;
 
 CServerDialogsApp::~CServerDialogsApp()
 {
-    ExitInstance();
+    // Still here at static destruction: the host ended without the last
+    // Cleanup. Qt's own globals may be gone by now, so the application is
+    // left to the end of the process rather than destroyed.
+    (void)m_ownApplication.release();
 }
 
 bool CServerDialogsApp::InitInstance()

@@ -100,10 +100,30 @@ int RunSubcommand(ModuleHost &module, const Options &options, const LOGFONTW &fo
     }
 }
 
+QStringList ArgumentsOf(int argc, char **argv)
+{
+    QStringList arguments;
+    for (int i = 0; i < argc; ++i)
+        arguments.append(QString::fromLocal8Bit(argv[i]));
+    return arguments;
+}
+
 } // namespace
 
 int main(int argc, char **argv)
 {
+    // stats speaks to a server itself: an administrator may run it where
+    // there is no display, so it gets an application without windows.
+    {
+        QString ignored;
+        const std::optional<Options> options = ParseOptions(ArgumentsOf(argc, argv), ignored);
+        if (options && !options->help && options->screenshots.isEmpty() &&
+            options->subcommand == QLatin1String("stats")) {
+            QCoreApplication app(argc, argv);
+            return RunStats(options->arguments);
+        }
+    }
+
     QApplication app(argc, argv);
     QString error;
     const std::optional<Options> options = ParseOptions(app.arguments(), error);

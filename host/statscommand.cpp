@@ -125,7 +125,12 @@ void PrintStatistics(IDirectStoreAccess &access)
 
 int RunStats(SubcommandContext &context)
 {
-    const auto options = ParseStatsOptions(context.arguments);
+    return RunStats(context.arguments);
+}
+
+int RunStats(const QStringList &arguments)
+{
+    const auto options = ParseStatsOptions(arguments);
     if (!options)
         return kExitUsage;
 

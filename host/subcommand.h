@@ -48,5 +48,7 @@ int RunEditArea(SubcommandContext &context);
 int RunExclude(SubcommandContext &context);
 int RunRemove(SubcommandContext &context);
 int RunStats(SubcommandContext &context);
+// stats needs neither the module nor a service object.
+int RunStats(const QStringList &arguments);
 
 } // namespace host

@@ -1,4 +1,5 @@
 #include "entry/module.h"
+#include "entry/serverdialogsapp.h"
 #include "serverlibs/testlibraries.h"
 
 #include <gtest/gtest.h>
@@ -73,7 +74,8 @@ protected:
     serverlibs::VekexLibrary m_vekex;
     serverlibs::RovoApiLibrary m_rovoApi;
     OpenDialogList m_dialogs;
-    ModuleLifetime m_module{m_vekex, m_rovoApi, m_dialogs};
+    CServerDialogsApp m_app;
+    ModuleLifetime m_module{m_vekex, m_rovoApi, m_dialogs, m_app};
     Names m_closed;
 };
 
@@ -91,6 +93,18 @@ TEST_F(ModuleLifetimeTest, FirstInitLoadsAndLastCleanupClosesWindowsAndReleases)
     EXPECT_EQ(m_closed, (Names{"newer", "older"}));
     EXPECT_EQ(m_rovoApi.UseCount(), 0u);
     EXPECT_FALSE(Loaded());
+}
+
+TEST_F(ModuleLifetimeTest, LastCleanupEndsTheApplicationTheModuleMade)
+{
+    ::setenv("QT_QPA_PLATFORM", "offscreen", 0);
+    m_module.Init();
+    ASSERT_NE(m_app.EnsureApplication(), nullptr);
+    m_module.Init();
+    m_module.Cleanup();
+    EXPECT_NE(QCoreApplication::instance(), nullptr);
+    m_module.Cleanup();
+    EXPECT_EQ(QCoreApplication::instance(), nullptr);
 }
 
 TEST_F(ModuleLifetimeTest, CleanupWithoutInitDoesNothing)
