@@ -1,6 +1,7 @@
 // One GetElementCount through direct store access, requestor, comm library
 // and the reference server process, beside a raw Unix-domain socket
-// ping-pong with another process using frames of the same sizes.
+// ping-pong with another process using frames of the same sizes (with and
+// without a time-out on the wait for the answer).
 
 #include "dunemere/directstoreaccess.h"
 #include "dunemere/requesttransferdata.h"
@@ -9,6 +10,7 @@
 
 #include <benchmark/benchmark.h>
 
+#include <poll.h>
 #include <sys/socket.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -96,7 +98,9 @@ bool Transfer(int fd, std::uint8_t *bytes, std::size_t size, bool write)
     return true;
 }
 
-void RawSocketPingPong(benchmark::State &state)
+// The client side waits for each answer with poll and a time-out, as any
+// client that must not hang does, or blocks in read without one.
+void PingPong(benchmark::State &state, bool withTimeout)
 {
     // Frame sizes: the record and its four-byte length.
     const tRequestTransferData request(kClientVersion, 5, 4002);
@@ -124,15 +128,30 @@ void RawSocketPingPong(benchmark::State &state)
     std::vector<std::uint8_t> out(requestSize), in(responseSize);
     for (auto _ : state) {
         Transfer(pair[0], out.data(), out.size(), true);
+        if (withTimeout) {
+            pollfd ready{pair[0], POLLIN, 0};
+            ::poll(&ready, 1, 20000);
+        }
         Transfer(pair[0], in.data(), in.size(), false);
     }
     ::close(pair[0]);
     ::waitpid(child, nullptr, 0);
 }
 
+void RawSocketPingPong(benchmark::State &state)
+{
+    PingPong(state, false);
+}
+
+void RawSocketPingPongWithTimeout(benchmark::State &state)
+{
+    PingPong(state, true);
+}
+
 BENCHMARK(GetElementCount_DirectStoreAccess)->Repetitions(9)->ReportAggregatesOnly(true)->UseRealTime();
 BENCHMARK(GetUserCount_DirectStoreAccess)->Repetitions(9)->ReportAggregatesOnly(true)->UseRealTime();
 BENCHMARK(RawSocketPingPong)->Repetitions(9)->ReportAggregatesOnly(true)->UseRealTime();
+BENCHMARK(RawSocketPingPongWithTimeout)->Repetitions(9)->ReportAggregatesOnly(true)->UseRealTime();
 
 } // namespace
 

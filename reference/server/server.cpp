@@ -14,6 +14,12 @@
 
 #include <cstdio>
 #include <list>
+
+#include <poll.h>
+#include <sys/eventfd.h>
+#include <unistd.h>
+
+#include <cerrno>
 #include <mutex>
 #include <stdexcept>
 #include <thread>
@@ -37,12 +43,25 @@ std::unique_ptr<cv::krn::osdep::Mutex> Hold(std::u16string_view name, const char
     return mutex;
 }
 
-void Serve(FramedSocket &socket, ServerContext &context, const std::atomic<bool> &stop)
+// Waits without a timer for the next bytes or the end of the server: a
+// wait with a time-out costs a timer per request, which on a virtual
+// machine is a good part of a round trip.
+bool WaitForInput(int socket, int stopEvent)
+{
+    pollfd waits[2] = {{socket, POLLIN, 0}, {stopEvent, POLLIN, 0}};
+    while (::poll(waits, 2, -1) < 0) {
+        if (errno != EINTR)
+            return false;
+    }
+    return waits[1].revents == 0;
+}
+
+void Serve(FramedSocket &socket, ServerContext &context, int stopEvent)
 {
     ProtocolSession session(context);
     cv::krn::ByteBuffer record;
-    while (!stop.load()) {
-        const std::uint32_t result = socket.Receive(record, kPollMilliseconds);
+    while (WaitForInput(socket.Descriptor(), stopEvent)) {
+        const std::uint32_t result = socket.Receive(record, 0);
         if (result == kResultTimeout)
             continue;
         if (result != kResultOk)
@@ -73,6 +92,14 @@ struct Server::State
     std::atomic<std::uint32_t> loggedOnUsers{0};
     AcceptorFactory makeKerberosAcceptor;
     cv::vek::rovo::comm::Listener listener;
+    // Readable once the server stops, waking every connection's thread.
+    int stopEvent = -1;
+
+    ~State()
+    {
+        if (stopEvent >= 0)
+            ::close(stopEvent);
+    }
 };
 
 Server::Server(ServerOptions options, AcceptorFactory makeKerberosAcceptor) : m_state(std::make_unique<State>())
@@ -81,6 +108,10 @@ Server::Server(ServerOptions options, AcceptorFactory makeKerberosAcceptor) : m_
     state.options = std::move(options);
     state.makeKerberosAcceptor = std::move(makeKerberosAcceptor);
     const std::u16string &portName = state.options.portName;
+
+    state.stopEvent = ::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK);
+    if (state.stopEvent < 0)
+        throw std::runtime_error("cannot create an event");
 
     // The mutexes come first: clients decide by them whether a server runs.
     if (portName.empty())
@@ -133,9 +164,9 @@ void Server::Run(const std::atomic<bool> &stop)
             continue;
         Connection &connection = connections.emplace_back();
         connection.socket = std::move(socket);
-        connection.thread = std::thread([&connection, &context, &stop] {
+        connection.thread = std::thread([&connection, &context, stopEvent = state.stopEvent] {
             try {
-                Serve(*connection.socket, context, stop);
+                Serve(*connection.socket, context, stopEvent);
             } catch (const std::exception &) {
                 // Out of memory or a failing store: this client loses its
                 // connection, the others keep theirs.
@@ -144,6 +175,8 @@ void Server::Run(const std::atomic<bool> &stop)
             connection.done.store(true);
         });
     }
+    const std::uint64_t one = 1;
+    [[maybe_unused]] const ssize_t written = ::write(state.stopEvent, &one, sizeof one);
     for (Connection &connection : connections)
         connection.thread.join();
 }
