@@ -1,7 +1,7 @@
 #include "pages/addsearchareadlg.h"
 
 #include "pages/defaultareaname.h"
-#include "pages/pathinspector.h"
+#include "pages/pathprobe.h"
 #include "resources/strings.h"
 #include "resources/templates.h"
 #include "sharedsource/imageset.h"

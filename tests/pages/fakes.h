@@ -3,7 +3,7 @@
 // Small fakes for the dialogs' owners: existing search areas and policy
 // (IInputTester) and what the file system says about paths.
 
-#include "pages/pathinspector.h"
+#include "pages/pathprobe.h"
 #include "sorvik/serverdialogs.h"
 #include "sorvik/wstringqt.h"
 

@@ -1,4 +1,4 @@
-#include "pages/pathinspector.h"
+#include "pages/pathprobe.h"
 
 #include <QDir>
 #include <QFileInfo>
