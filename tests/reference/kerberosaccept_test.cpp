@@ -96,6 +96,17 @@ TEST(KdcRealm, StartsQuicklyAndLeavesNothingBehind)
     EXPECT_EQ(Env("KRB5CCNAME"), before);
 }
 
+TEST(KdcRealm, MissingToolIsReportedWithWhereToGetIt)
+{
+    try {
+        testsupport::KdcRealm::FindTool("sorvik-no-such-kerberos-tool");
+        ADD_FAILURE() << "found";
+    } catch (const std::runtime_error &error) {
+        EXPECT_THAT(error.what(), HasSubstr("run scripts/setup"));
+    }
+    EXPECT_FALSE(testsupport::KdcRealm::FindTool("krb5kdc").empty()) << "CI must have the KDC";
+}
+
 TEST(KdcRealm, TwoRealmsRunSideBySideOnTheirOwnPorts)
 {
     testsupport::KdcRealm first;

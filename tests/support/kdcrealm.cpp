@@ -35,7 +35,9 @@ constexpr auto kToolDeadline = 20s;
 constexpr auto kKdcStartDeadline = 5s;
 constexpr int kPortAttempts = 5;
 
-std::string FindTool(const std::string &name)
+} // namespace
+
+std::string KdcRealm::FindTool(const std::string &name)
 {
     std::string path = std::getenv("PATH") ? std::getenv("PATH") : "";
     path += ":/usr/sbin:/sbin:/usr/bin:/bin";
@@ -50,6 +52,8 @@ std::string FindTool(const std::string &name)
     throw std::runtime_error("Kerberos tool '" + name +
                              "' not found: run scripts/setup (it installs krb5-kdc, krb5-admin-server and krb5-user)");
 }
+
+namespace {
 
 std::string ReadFile(const std::filesystem::path &file)
 {

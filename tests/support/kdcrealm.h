@@ -27,6 +27,11 @@ public:
     using Environment = std::vector<std::pair<std::string, std::string>>;
 
     static constexpr const char *kRealm = "SORVIK.TEST";
+
+    // The Kerberos tool's path; a missing tool raises std::runtime_error
+    // naming scripts/setup, which installs them.
+    static std::string FindTool(const std::string &name);
+
     static constexpr const char *kUser = "alice";
     // The service the server runs as, and the host-based name clients use.
     static constexpr const char *kService = "sorvik/localhost";
