@@ -331,6 +331,8 @@ public:
     {
         if (!Enter("GetIndexManager", status) || m_log->noIndexManager)
             return nullptr;
+        if (m_log->indexManager)
+            return Wrapped<SpyIndexManager>(RefPtr<rovo::IIndexManager>(m_log->indexManager).Detach());
         return Wrapped<SpyIndexManager>(m_real->GetIndexManager(status));
     }
     void ResetSorvik(std::int32_t mode, std::int32_t flags, std::int32_t *status) override
@@ -351,8 +353,15 @@ private:
 
 } // namespace
 
+void CallLog::Clear()
+{
+    const std::lock_guard<std::mutex> guard(m_lock);
+    calls.clear();
+}
+
 int CallLog::Count(std::string_view operation) const
 {
+    const std::lock_guard<std::mutex> guard(m_lock);
     return int(std::count_if(calls.begin(), calls.end(), [operation](const std::string &call) {
         return call == operation || call.rfind(std::string(operation) + " ", 0) == 0;
     }));
@@ -360,6 +369,7 @@ int CallLog::Count(std::string_view operation) const
 
 std::vector<std::string> CallLog::Only(std::initializer_list<std::string_view> names) const
 {
+    const std::lock_guard<std::mutex> guard(m_lock);
     std::vector<std::string> kept;
     for (const std::string &call : calls) {
         const std::string_view operation = std::string_view(call).substr(0, call.find(' '));
@@ -374,6 +384,7 @@ bool CallLog::Enter(std::string_view operation, std::int32_t *status, const std:
     std::string line(operation);
     for (std::size_t i = 0; i < arguments.size(); ++i)
         line += (i ? " | " : " ") + arguments[i];
+    const std::lock_guard<std::mutex> guard(m_lock);
     calls.push_back(line);
     const auto failure = failures.find(operation);
     if (failure == failures.end())

@@ -11,30 +11,37 @@
 #include <cstdint>
 #include <map>
 #include <memory>
+#include <mutex>
 #include <string>
 #include <string_view>
 #include <vector>
 
 namespace testsupport {
 
+// Calls may come from worker threads too (the wait window's).
 class CallLog final
 {
 public:
     // One line per call: the operation's name, then its text arguments
-    // (paths, names, numbers) separated by " | ".
+    // (paths, names, numbers) separated by " | ". Read it when no worker runs.
     std::vector<std::string> calls;
     // Operations that fail, by name, with the status they set.
     std::map<std::string, std::int32_t, std::less<>> failures;
     // When set, GetIndexManager answers null as if no server ran.
     bool noIndexManager = false;
+    // When set, GetIndexManager answers a spy on this one instead of the real one.
+    cv::krn::RefPtr<cv::rovo::IIndexManager> indexManager;
 
     int Count(std::string_view operation) const;
     // The calls whose operation is one of names, in order.
     std::vector<std::string> Only(std::initializer_list<std::string_view> names) const;
-    void Clear() { calls.clear(); }
+    void Clear();
 
     // Records the call; false when the test made it fail (status set).
     bool Enter(std::string_view operation, std::int32_t *status, const std::vector<std::string> &arguments = {});
+
+private:
+    mutable std::mutex m_lock;
 };
 
 // The spy of sorvik: its view, editor and index manager are spies too.
