@@ -47,7 +47,9 @@ std::unique_ptr<ManagerConnection> ManagerConnection::Open(std::u16string_view p
     }
     // A blocking connect to a local socket waits only while the server's
     // queue of new connections is full; the send time-out bounds that wait.
-    const timeval limit{time_t(timeoutMs / 1000), suseconds_t(timeoutMs % 1000 * 1000)};
+    // (A zero time-out would mean none at all.)
+    const std::uint32_t bound = std::max<std::uint32_t>(timeoutMs, 1);
+    const timeval limit{time_t(bound / 1000), suseconds_t(bound % 1000 * 1000)};
     ::setsockopt(fd, SOL_SOCKET, SO_SNDTIMEO, &limit, sizeof limit);
     int result;
     do {

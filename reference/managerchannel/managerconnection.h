@@ -31,7 +31,8 @@ public:
 
     // Connects without waiting for a server to appear: nullptr with error
     // set to the errno of the failed attempt (ENOENT or ECONNREFUSED: nobody
-    // serves the instance; EAGAIN: its queue of new connections is full).
+    // serves the instance; EAGAIN: its queue of new connections stayed full
+    // for the time-out; EINVAL: the port name cannot name a socket).
     static std::unique_ptr<ManagerConnection> Open(std::u16string_view portName, std::uint32_t timeoutMs, int &error);
 
     // Sends the request and waits for its answer; the time-out covers both.

@@ -75,7 +75,8 @@ public:
         int error = 0;
         const auto connection = ManagerConnection::Open(m_portName, timeoutMs, error);
         if (!connection) {
-            if (error == ENOENT || error == ECONNREFUSED || error == ENOTDIR)
+            // EINVAL: a port name that cannot name a socket, so nothing serves it.
+            if (error == ENOENT || error == ECONNREFUSED || error == ENOTDIR || error == EINVAL)
                 return std::nullopt;
             if (error == EAGAIN || error == EWOULDBLOCK)
                 Bad(timeoutCode, QStringLiteral("%1 accepts no connection").arg(Describe(m_portName)));

@@ -137,6 +137,7 @@ TEST_F(IndexManagerTest, ThereIsAnIndexManagerExactlyWhileTheSorviksInstanceRuns
     auto instance = Open(u"<PortName>P</PortName>");
     EXPECT_FALSE(Manager(local.get())) << "no server runs";
     EXPECT_FALSE(Manager(instance.get()));
+    EXPECT_FALSE(Manager(Open(u"<PortName>no/socket</PortName>").get())) << "no server can serve that name";
 
     auto server = Start({"--portname", "P"}, "P");
     auto manager = Manager(instance.get());
