@@ -193,7 +193,6 @@ Server::Server(ServerOptions options, AcceptorFactory makeKerberosAcceptor) : m_
 
 Server::~Server() = default;
 
-
 void Server::Run(const std::atomic<bool> &stop)
 {
     State &state = *m_state;
