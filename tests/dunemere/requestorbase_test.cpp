@@ -221,6 +221,56 @@ TEST_F(RequestorTest, AnswersToOtherRequestsCannotHoldTheClientPastItsTimeout)
     EXPECT_LT(waited, std::chrono::milliseconds(timeout) + 3s);
 }
 
+TEST_F(RequestorTest, LostConnectionDuringSendIsMadeAgainWithANewLogOn)
+{
+    Signal dropped;
+    ScriptedServer server(u"P", [&](const ScriptedServer::Request &request, ScriptedServer::Peer &peer) {
+        if (request.category == 4) {
+            peer.Send(ScriptedServer::Data(request.id, 0));
+            return;
+        }
+        peer.Send(ScriptedServer::Data(request.id, 0, std::uint32_t(request.connection)));
+        if (request.connection == 1) {
+            peer.Drop();
+            dropped.Raise();
+        }
+    });
+    RequestorBase requestor(Settings(), m_log);
+    EXPECT_EQ(Ask(requestor), 1u);
+    ASSERT_TRUE(dropped.WaitFor(10s));
+
+    EXPECT_EQ(Ask(requestor), 2u) << "answered on a second connection";
+    EXPECT_EQ(server.Connections(), 2);
+    const auto permissions = OfKind(server.Received(), 4, 3001);
+    ASSERT_EQ(permissions.size(), 2u);
+    EXPECT_EQ(permissions[1].connection, 2) << "logged on again";
+    const auto requests = OfKind(server.Received(), 5, 4002);
+    ASSERT_EQ(requests.size(), 2u);
+    EXPECT_EQ(requests[1].connection, 2);
+}
+
+TEST_F(RequestorTest, SendThatCannotFinishRaisesTimeoutDuringSend)
+{
+    // The server logs the client on and then stops reading, so a large
+    // request fills the socket and its send runs out of time.
+    Signal resume;
+    ScriptedServer server(u"P", [&](const ScriptedServer::Request &request, ScriptedServer::Peer &peer) {
+        peer.Send(ScriptedServer::Data(request.id, 0));
+        if (request.category == 4)
+            resume.WaitFor(20s);
+    });
+    RequestorBase requestor(Settings(u"<sendtimeout>300</sendtimeout>"), m_log);
+    tRequestTransferData request(k18, 2, 1004); // a request that carries a list of identifiers
+    const std::vector<GUID> identifiers(200000, cv::vek::rovo::NewRequestIdentifier());
+    request.SetIdentifiers(identifiers.data(), std::int32_t(identifiers.size()));
+
+    const auto error = ErrorOf([&] { requestor.Exchange(3000, request); });
+    resume.Raise();
+    EXPECT_EQ(error.Code(), 180u);
+    EXPECT_THAT(Utf8(error.Message()), HasSubstr("): SKCP:     Timeout during send"));
+    EXPECT_EQ(OfKind(server.Received(), 4, 3001).size(), 1u) << "the log-on went through";
+}
+
 TEST_F(RequestorTest, LostConnectionDuringSendWithBudgetOneCannotConnect)
 {
     Signal dropped;
