@@ -106,7 +106,10 @@ TEST_P(VersionNegotiation, SecondPermissionCarriesTheServersVersionAndLaterReque
 
 INSTANTIATE_TEST_SUITE_P(Servers, VersionNegotiation,
                          ::testing::Values(Negotiation{PackVersion(17, 0, 0), PackVersion(17, 0, 0)},
-                                           Negotiation{PackVersion(19, 0, 0), k18}));
+                                           Negotiation{PackVersion(19, 0, 0), k18}),
+                         [](const ::testing::TestParamInfo<Negotiation> &info) {
+                             return "server_" + std::to_string(sorvik::VersionMajor(info.param.server));
+                         });
 
 TEST_F(RequestorTest, ServerRefusingBothVersionsIsIncompatible)
 {
