@@ -151,6 +151,7 @@ TEST_F(DirectStoreAccessTest, FailuresGiveTheFailureValuesAndNeverRaise)
 
 TEST_F(DirectStoreAccessTest, UnreachableInstanceGivesTheFailureValue)
 {
+    testsupport::ScopedEnv connectWindow("CORVANE_COMM_CONNECT_WAIT_MS", "0");
     AccessRef access{CreateDirectStoreAccess(u"Nobody", 0)};
     EXPECT_EQ(access->GetElementCount(8), kFailure);
 }

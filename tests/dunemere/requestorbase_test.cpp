@@ -377,6 +377,7 @@ TEST_F(RequestorTest, MalformedResponseIsAProtocolErrorAndDropsTheConnection)
 
 TEST_F(RequestorTest, NobodyListeningForAnInstanceCannotConnect)
 {
+    testsupport::ScopedEnv connectWindow("CORVANE_COMM_CONNECT_WAIT_MS", "0");
     RequestorBase requestor(Settings(), m_log);
     const auto error = ErrorOf([&] { Ask(requestor); });
     EXPECT_EQ(error.Code(), 65u) << "the comm library's error";

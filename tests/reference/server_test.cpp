@@ -243,6 +243,7 @@ TEST_F(ServerTest, StatsCommandEndsWhenTheServerDoes)
     EXPECT_EQ(waiting.Wait(std::chrono::seconds(10)), 0);
     EXPECT_NE(FileText(m_dir.file("wait.out")).find("stopped: S"), std::string::npos);
 
+    testsupport::ScopedEnv connectWindow("CORVANE_COMM_CONNECT_WAIT_MS", "0");
     testsupport::SorvikProcess unanswered(SORVIK_HOST, {"stats", "--portname", "S"});
     EXPECT_EQ(unanswered.Wait(std::chrono::seconds(30)), 3) << "nobody answers any more";
 }
