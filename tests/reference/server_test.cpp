@@ -16,6 +16,7 @@
 #include <gtest/gtest.h>
 
 #include <signal.h>
+#include <sqlite3.h>
 
 #include <condition_variable>
 #include <fstream>
@@ -54,11 +55,31 @@ bool WaitFor(Condition condition, std::chrono::milliseconds within = std::chrono
     return true;
 }
 
+// The counters of the index status as "name=value" in name order.
+std::string CountersIn(const std::filesystem::path &statusFile)
+{
+    sqlite3 *db = nullptr;
+    EXPECT_EQ(sqlite3_open_v2(statusFile.c_str(), &db, SQLITE_OPEN_READONLY, nullptr), SQLITE_OK);
+    sqlite3_busy_timeout(db, 5000);
+    std::string counters;
+    sqlite3_stmt *query = nullptr;
+    if (sqlite3_prepare_v2(db, "SELECT name, value FROM counters ORDER BY name", -1, &query, nullptr) == SQLITE_OK) {
+        while (sqlite3_step(query) == SQLITE_ROW)
+            counters += std::string(counters.empty() ? "" : " ") +
+                        reinterpret_cast<const char *>(sqlite3_column_text(query, 0)) + '=' +
+                        std::to_string(sqlite3_column_int64(query, 1));
+    }
+    sqlite3_finalize(query);
+    sqlite3_close(db);
+    return counters;
+}
+
 TEST_F(ServerTest, StatisticsComeFromTheIndexStatusAndResetsChangeIt)
 {
     auto server = Start({"--portname", "P"}, "P");
     AccessRef access{CreateDirectStoreAccess(u"P", 0)};
     EXPECT_EQ(access->GetElementCount(8), 0u);
+    const auto Counters = [this] { return CountersIn(StatusFile()); };
 
     Sql("INSERT INTO element_counts VALUES (8, 120), (16, 7), (32, 3456);"
         "INSERT INTO parselet_timeouts VALUES ('CSV', 3), ('HDF', 2);"
@@ -82,9 +103,14 @@ TEST_F(ServerTest, StatisticsComeFromTheIndexStatusAndResetsChangeIt)
     access->ResetIndexStatusTimeouted(); // 18.0.0 no longer knows it
     EXPECT_EQ(access->GetFileviewsTimeouted(), 5u);
     access->ResetIndexStatusFailure();
+    EXPECT_EQ(Counters(), "disk_full_crawl_stop=1 failures=0 not_my_file=5");
     access->ResetIndexStatusNotMyFile();
-    AccessRef second{CreateDirectStoreAccess(u"P", 0)};
-    EXPECT_EQ(second->GetUserCount(0), 2u);
+    EXPECT_EQ(Counters(), "disk_full_crawl_stop=1 failures=0 not_my_file=0");
+    {
+        AccessRef second{CreateDirectStoreAccess(u"P", 0)};
+        EXPECT_EQ(second->GetUserCount(0), 2u);
+    }
+    EXPECT_TRUE(WaitFor([&] { return access->GetUserCount(0) == 1u; })) << "the second user's session ended";
 
     EXPECT_EQ(server->Stop(SIGTERM), 0);
     EXPECT_FALSE(std::filesystem::exists(testsupport::SorvikProcess::SocketOf("P")));
