@@ -117,6 +117,29 @@ TEST_F(ServerTest, StatisticsComeFromTheIndexStatusAndResetsChangeIt)
     EXPECT_FALSE(MutexHeld(InstanceMutexName(u"P")));
 }
 
+TEST_F(ServerTest, AStatusStoreThatFailsIsAnsweredWithItsStatusCode)
+{
+    auto server = Start({"--portname", "P"}, "P");
+    cv::util::file::log::ILogImp log;
+    PLUGIN::Config config(u"<server>localhost</server><portname>P</portname>");
+    RequestorBase requestor(config, log);
+    cv::vek::rovo::tRequestTransferData request(config.GetServerVersion(), 5, 4003);
+    EXPECT_EQ(cv::vek::rovo::tResponseTransferData(requestor.Exchange(5000, request)).Value(), 0u);
+
+    Sql("DROP TABLE counters");
+    cv::vek::rovo::tRequestTransferData again(config.GetServerVersion(), 5, 4003);
+    try {
+        requestor.Exchange(5000, again);
+        ADD_FAILURE() << "answered without its counters";
+    } catch (const DataCache::ToIntMsgDa &error) {
+        EXPECT_EQ(error.Code(), 181u);
+        EXPECT_NE(error.Message().find(u"Failed with error code -500!"), std::u16string::npos);
+    }
+    cv::vek::rovo::tRequestTransferData elements(config.GetServerVersion(), 5, 4002);
+    EXPECT_EQ(cv::vek::rovo::tResponseTransferData(requestor.Exchange(5000, elements)).Value(), 0u)
+        << "the rest of the status still answers";
+}
+
 TEST_F(ServerTest, OlderServersAreSpokenToInTheirVersion)
 {
     {
