@@ -351,6 +351,37 @@ TEST_F(Store, AnImportReplacesTheWholeConfigurationButKeepsPolicyAndPendingReque
     EXPECT_EQ(raw.Rows("SELECT kind, argument FROM requests"), std::vector<std::string>{"start-indexing|0"});
 }
 
+TEST_F(Store, ACommitLeavesWorkOrdersForTheServerAndAFailedOneLeavesNone)
+{
+    RawStore raw(StoreFile());
+    auto requests = [&] { return raw.Rows("SELECT kind, argument FROM requests ORDER BY id"); };
+    auto editor = Editor();
+    OkVoid([&](std::int32_t *status) { editor->StartIndexingNow(0, status); });
+    OkVoid([&](std::int32_t *status) { editor->SetIndexPath(WString(u"/var/index/"), status); });
+    auto names = Container({u"CSV", u"hdf5"});
+    OkVoid([&](std::int32_t *status) { editor->ReindexParselets(names.get(), status); });
+    EXPECT_TRUE(requests().empty()) << "nothing before the commit";
+    Commit(editor.get());
+    EXPECT_EQ(requests(), (std::vector<std::string>{"start-indexing|0", "move-index|/var/index", "reindex-parselet|CSV",
+                                                    "reindex-parselet|HDF5"}));
+
+    // The same index folder again moves nothing.
+    OkVoid([&](std::int32_t *status) { editor->SetIndexPath(WString(u"/VAR/index"), status); });
+    Commit(editor.get());
+    EXPECT_EQ(requests().size(), 4u);
+
+    // A commit that fails leaves none of its orders.
+    AddArea(editor.get(), u"/a", u"Same");
+    AddArea(editor.get(), u"/b", u"same");
+    OkVoid([&](std::int32_t *status) { editor->StartIndexingNow(0, status); });
+    OkVoid([&](std::int32_t *status) { editor->SetIndexPath(WString(u"/elsewhere"), status); });
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) { editor->CommitConfiguration(status); }), status::Conflict);
+    EXPECT_EQ(requests().size(), 4u);
+
+    OkVoid([&](std::int32_t *status) { m_sorvik->ResetSorvik(cv::rovo::kResetIndex, 0, status); });
+    EXPECT_EQ(requests().back(), "reset-index|4");
+}
+
 TEST_F(Store, AnExportCarriesUncommittedEditsWithoutCommittingThem)
 {
     auto editor = Editor();
