@@ -17,6 +17,7 @@ inline constexpr std::chrono::milliseconds kLocalWaitLimit{60000};
 // kLocalWait, or the milliseconds that $CORVANE_COMM_CONNECT_WAIT_MS gives
 // (0 to kLocalWaitLimit; anything else is ignored).
 std::chrono::milliseconds LocalConnectWait();
+
 // A remote server gets this long for each of its addresses.
 inline constexpr std::chrono::milliseconds kTcpConnectTimeout{5000};
 
