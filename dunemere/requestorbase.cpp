@@ -38,7 +38,6 @@ constexpr std::int32_t kStatusNotLoggedOn = -65536;
 constexpr std::uint32_t kPermissionCategory = 4;
 constexpr std::uint32_t kPermissionCode = 3001;
 constexpr std::uint32_t kAuthenticationCode = 3002;
-constexpr std::uint32_t kClientProofVersion = sorvik::PackVersion(3, 1, 1);
 
 using comm::kResultConnectionLost;
 using comm::kResultOk;
@@ -203,17 +202,8 @@ RequestorBase::Response RequestorBase::RequestPermission(bool firstAttempt, std:
         << sorvik::VersionMinor(version) << '.' << sorvik::VersionPatch(version);
 
     tRequestTransferData request(version, kPermissionCategory, kPermissionCode);
-    if (version >= kClientProofVersion) {
-        const std::u16string &identification = m_config.GetClientIdentificationString();
-        const std::u16string &secretKey = m_config.GetClientIdentificationSecretKey();
-        if (!identification.empty() && !secretKey.empty()) {
-            request.AppendParameter(identification);
-            request.AppendParameter(ComputeClientProof(secretKey, identification, request.RequestIdentifier()));
-        } else {
-            request.AppendParameter({});
-            request.AppendParameter({});
-        }
-    }
+    AddPermissionParameters(request, m_config.GetClientIdentificationString(),
+                            m_config.GetClientIdentificationSecretKey());
 
     std::uint32_t timeout = m_config.GetSendTimeout();
     if (firstAttempt && attemptsLeft == m_attemptBudget && StartServerIfNeeded())

@@ -14,6 +14,7 @@
 #include <chrono>
 #include <cstring>
 #include <fstream>
+#include <optional>
 #include <string>
 #include <fcntl.h>
 #include <sys/socket.h>
@@ -254,6 +255,31 @@ TEST_F(Resolution, AListenerTakesOverAStaleSocketButNotALiveOne)
     ::close(orphan);
     Listener second;
     EXPECT_NO_THROW(second.ListenLocal(u"N", u"C"));
+}
+
+TEST(LocalConnectWait, FiveSecondsUnlessTheSettingGivesAnotherWindow)
+{
+    using std::chrono::milliseconds;
+    const std::pair<std::optional<std::string>, milliseconds> rows[] = {
+        {std::nullopt, milliseconds(5000)}, {"", milliseconds(5000)},      {"250", milliseconds(250)},
+        {"0", milliseconds(0)},             {"60000", milliseconds(60000)}, {"60001", milliseconds(5000)},
+        {"-1", milliseconds(5000)},         {"2s", milliseconds(5000)},     {" 250", milliseconds(5000)},
+    };
+    for (const auto &[setting, window] : rows) {
+        testsupport::ScopedEnv env("CORVANE_COMM_CONNECT_WAIT_MS", setting);
+        EXPECT_EQ(LocalConnectWait(), window) << setting.value_or("(unset)");
+    }
+}
+
+TEST_F(Resolution, NobodyListeningLocallyIsTriedForTheWholeWindow)
+{
+    const Endpoint endpoint = Resolve(u"localhost", u"Nobody", u"C");
+    testsupport::ScopedEnv window("CORVANE_COMM_CONNECT_WAIT_MS", "300");
+    const auto started = std::chrono::steady_clock::now();
+    int fd = -1;
+    EXPECT_EQ(ConnectEndpoint(endpoint, fd), kResultUnreachable);
+    EXPECT_GE(std::chrono::steady_clock::now() - started, std::chrono::milliseconds(250));
+    EXPECT_EQ(fd, -1);
 }
 
 TEST(Tcp, CarriesRecordsBothWays)

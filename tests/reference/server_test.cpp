@@ -16,6 +16,7 @@
 #include <gtest/gtest.h>
 
 #include <signal.h>
+#include <sqlite3.h>
 
 #include <condition_variable>
 #include <fstream>
@@ -54,11 +55,31 @@ bool WaitFor(Condition condition, std::chrono::milliseconds within = std::chrono
     return true;
 }
 
+// The counters of the index status as "name=value" in name order.
+std::string CountersIn(const std::filesystem::path &statusFile)
+{
+    sqlite3 *db = nullptr;
+    EXPECT_EQ(sqlite3_open_v2(statusFile.c_str(), &db, SQLITE_OPEN_READONLY, nullptr), SQLITE_OK);
+    sqlite3_busy_timeout(db, 5000);
+    std::string counters;
+    sqlite3_stmt *query = nullptr;
+    if (sqlite3_prepare_v2(db, "SELECT name, value FROM counters ORDER BY name", -1, &query, nullptr) == SQLITE_OK) {
+        while (sqlite3_step(query) == SQLITE_ROW)
+            counters += std::string(counters.empty() ? "" : " ") +
+                        reinterpret_cast<const char *>(sqlite3_column_text(query, 0)) + '=' +
+                        std::to_string(sqlite3_column_int64(query, 1));
+    }
+    sqlite3_finalize(query);
+    sqlite3_close(db);
+    return counters;
+}
+
 TEST_F(ServerTest, StatisticsComeFromTheIndexStatusAndResetsChangeIt)
 {
     auto server = Start({"--portname", "P"}, "P");
     AccessRef access{CreateDirectStoreAccess(u"P", 0)};
     EXPECT_EQ(access->GetElementCount(8), 0u);
+    const auto Counters = [this] { return CountersIn(StatusFile()); };
 
     Sql("INSERT INTO element_counts VALUES (8, 120), (16, 7), (32, 3456);"
         "INSERT INTO parselet_timeouts VALUES ('CSV', 3), ('HDF', 2);"
@@ -82,13 +103,41 @@ TEST_F(ServerTest, StatisticsComeFromTheIndexStatusAndResetsChangeIt)
     access->ResetIndexStatusTimeouted(); // 18.0.0 no longer knows it
     EXPECT_EQ(access->GetFileviewsTimeouted(), 5u);
     access->ResetIndexStatusFailure();
+    EXPECT_EQ(Counters(), "disk_full_crawl_stop=1 failures=0 not_my_file=5");
     access->ResetIndexStatusNotMyFile();
-    AccessRef second{CreateDirectStoreAccess(u"P", 0)};
-    EXPECT_EQ(second->GetUserCount(0), 2u);
+    EXPECT_EQ(Counters(), "disk_full_crawl_stop=1 failures=0 not_my_file=0");
+    {
+        AccessRef second{CreateDirectStoreAccess(u"P", 0)};
+        EXPECT_EQ(second->GetUserCount(0), 2u);
+    }
+    EXPECT_TRUE(WaitFor([&] { return access->GetUserCount(0) == 1u; })) << "the second user's session ended";
 
     EXPECT_EQ(server->Stop(SIGTERM), 0);
     EXPECT_FALSE(std::filesystem::exists(testsupport::SorvikProcess::SocketOf("P")));
     EXPECT_FALSE(MutexHeld(InstanceMutexName(u"P")));
+}
+
+TEST_F(ServerTest, AStatusStoreThatFailsIsAnsweredWithItsStatusCode)
+{
+    auto server = Start({"--portname", "P"}, "P");
+    cv::util::file::log::ILogImp log;
+    PLUGIN::Config config(u"<server>localhost</server><portname>P</portname>");
+    RequestorBase requestor(config, log);
+    cv::vek::rovo::tRequestTransferData request(config.GetServerVersion(), 5, 4003);
+    EXPECT_EQ(cv::vek::rovo::tResponseTransferData(requestor.Exchange(5000, request)).Value(), 0u);
+
+    Sql("DROP TABLE counters");
+    cv::vek::rovo::tRequestTransferData again(config.GetServerVersion(), 5, 4003);
+    try {
+        requestor.Exchange(5000, again);
+        ADD_FAILURE() << "answered without its counters";
+    } catch (const DataCache::ToIntMsgDa &error) {
+        EXPECT_EQ(error.Code(), 181u);
+        EXPECT_NE(error.Message().find(u"Failed with error code -500!"), std::u16string::npos);
+    }
+    cv::vek::rovo::tRequestTransferData elements(config.GetServerVersion(), 5, 4002);
+    EXPECT_EQ(cv::vek::rovo::tResponseTransferData(requestor.Exchange(5000, elements)).Value(), 0u)
+        << "the rest of the status still answers";
 }
 
 TEST_F(ServerTest, OlderServersAreSpokenToInTheirVersion)
@@ -243,6 +292,7 @@ TEST_F(ServerTest, StatsCommandEndsWhenTheServerDoes)
     EXPECT_EQ(waiting.Wait(std::chrono::seconds(10)), 0);
     EXPECT_NE(FileText(m_dir.file("wait.out")).find("stopped: S"), std::string::npos);
 
+    testsupport::ScopedEnv connectWindow("CORVANE_COMM_CONNECT_WAIT_MS", "0");
     testsupport::SorvikProcess unanswered(SORVIK_HOST, {"stats", "--portname", "S"});
     EXPECT_EQ(unanswered.Wait(std::chrono::seconds(30)), 3) << "nobody answers any more";
 }
