@@ -292,21 +292,62 @@ TEST_F(Store, ExportThenImportReproducesTheConfiguration)
     auto view = View();
     OkVoid([&](std::int32_t *status) { view->ExportConfiguration(WString(U16(exported)), editor.get(), status); });
 
-    // Into another Sorvik: nothing arrives before its commit.
-    auto other = Open(u"<Name>Lab Server</Name><SorvikType>valdorn</SorvikType>");
+    // Into another Sorvik: its store has nothing before the commit.
+    const char16_t *lab = u"<Name>Lab Server</Name><SorvikType>valdorn</SorvikType>";
+    auto other = Open(lab);
     EXPECT_EQ(Utf8(Ok([&](std::int32_t *status) { return other->GetSorvikName(status); })), "Lab Server");
     auto otherView = View(other.get());
     auto otherEditor = Editor(other.get());
     OkVoid([&](std::int32_t *status) {
         otherView->ImportConfiguration(WString(U16(exported)), otherEditor.get(), status);
     });
-    EXPECT_TRUE(Areas(otherView.get()).empty());
+    auto elsewhere = Open(lab);
+    EXPECT_TRUE(Areas(View(elsewhere.get()).get()).empty());
     Commit(otherEditor.get());
     EXPECT_EQ(Areas(otherView.get()), Areas(view.get()));
+    EXPECT_EQ(Areas(View(elsewhere.get()).get()), Areas(view.get()));
 
     const std::string again = File("again.skc");
     OkVoid([&](std::int32_t *status) { otherView->ExportConfiguration(WString(U16(again)), nullptr, status); });
     EXPECT_EQ(Slurp(again), Slurp(exported));
+}
+
+TEST_F(Store, ViewsOfTheImportingSorvikShowTheImportUntilItIsCommittedOrDropped)
+{
+    auto editor = Editor();
+    AddArea(editor.get(), u"/data/old", u"Old");
+    Commit(editor.get());
+    AddArea(editor.get(), u"/data/new", u"New");
+    AddExcluded(editor.get(), u"/data/new/tmp", u"tmp");
+    OkVoid([&](std::int32_t *status) { editor->SetIdleTime(77, status); });
+    const std::string file = File("new.skc");
+    auto view = View();
+    OkVoid([&](std::int32_t *status) { view->ExportConfiguration(WString(U16(file)), editor.get(), status); });
+    editor.Reset();
+
+    // A properties dialog reloads its pages from the view after an import.
+    auto importing = Editor();
+    EXPECT_EQ(Areas(view.get()), std::vector<std::string>{"/data/old|/data/old|Old"}) << "before the import: the store";
+    OkVoid([&](std::int32_t *status) { view->ImportConfiguration(WString(U16(file)), importing.get(), status); });
+    auto otherView = View();
+    for (auto *shown : {view.get(), otherView.get()}) {
+        EXPECT_EQ(Areas(shown), (std::vector<std::string>{"/data/old|/data/old|Old", "/data/new|/data/new|New", "  /data/new/tmp"}));
+        EXPECT_EQ(Ok([&](std::int32_t *status) { return shown->GetIdleTime(status); }), 77u);
+        EXPECT_TRUE(Ok([&](std::int32_t *status) { return shown->IsExcludedFolder(WString(u"/data/new/tmp/"), status); }));
+    }
+    AddArea(importing.get(), u"/data/later", u"Later");
+    EXPECT_EQ(Areas(view.get()).back(), "/data/later|/data/later|Later") << "with what is recorded after the import";
+    auto elsewhere = Open();
+    EXPECT_EQ(Areas(View(elsewhere.get()).get()).size(), 1u) << "another Sorvik object sees only the store";
+
+    importing.Reset();
+    EXPECT_EQ(Areas(view.get()).size(), 1u) << "an import dropped with its editor is gone";
+
+    importing = Editor();
+    OkVoid([&](std::int32_t *status) { view->ImportConfiguration(WString(U16(file)), importing.get(), status); });
+    Commit(importing.get());
+    EXPECT_EQ(Areas(View(elsewhere.get()).get()).size(), 3u);
+    EXPECT_EQ(Areas(view.get()).size(), 3u) << "committed: the store again";
 }
 
 TEST_F(Store, AnImportReplacesTheWholeConfigurationButKeepsPolicyAndPendingRequests)
