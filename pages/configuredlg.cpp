@@ -146,8 +146,11 @@ void CConfigureDlg::FillTree()
     for (std::size_t i = 0; i < m_areas.size(); ++i) {
         SearchAreaRecord &area = m_areas[i];
         area.item = CConMenuCTreeCtrl::NewSearchAreaItem(area.displayText, m_searchAreaIcon, int(i));
-        for (const auto &entry : area.excluded)
-            area.item->addChild(CConMenuCTreeCtrl::NewExcludedFolderItem(entry.first, m_excludedFolderIcon));
+        QList<QTreeWidgetItem *> children;
+        children.reserve(qsizetype(area.excluded.Size()));
+        for (const ExclusionMap::Entry &entry : area.excluded)
+            children.push_back(CConMenuCTreeCtrl::NewExcludedFolderItem(entry.relative, m_excludedFolderIcon));
+        area.item->addChildren(children);
         items.push_back(area.item);
     }
     // One insertion for all: the view lays itself out once.
@@ -264,8 +267,8 @@ void CConfigureDlg::InsertSearchArea(const QString &path, const QString &name, c
 
     SearchAreaRecord &added = m_areas.back();
     added.excluded = std::move(collected);
-    for (const auto &entry : added.excluded)
-        AddExcludedItem(*added.item, entry.first, false);
+    for (const ExclusionMap::Entry &entry : added.excluded)
+        AddExcludedItem(*added.item, entry.relative, false);
     m_modified = true;
     UpdateToolBar();
 }
@@ -279,15 +282,15 @@ void CConfigureDlg::Absorb(std::size_t index, const QString &relative, const QSt
     // Its excluded folders stay where they are, now below the new search area;
     // its own folder simply becomes part of it.
     const char16_t separator = serverlibs::SeparatorOf(ToView(path));
-    for (const auto &entry : area.excluded) {
-        const QString newRelative = JoinPath(relative, RelativeName(entry.second, area.path), separator);
+    for (const ExclusionMap::Entry &entry : area.excluded) {
+        const QString newRelative = JoinPath(relative, RelativeName(entry.absolute, area.path), separator);
         const QString newAbsolute = JoinPath(path, newRelative, separator);
         Record([&](cv::rovo::IConfigurationEditor &editor, std::int32_t *status) {
             WString kept;
             editor.AddFolder(&kept, FromQString(newAbsolute), WString(), FromQString(newRelative), 0, 1, WString(),
                              status);
         });
-        collected.emplace(newRelative, newAbsolute);
+        collected.Add(newRelative, newAbsolute);
     }
     EraseArea(index);
 }
@@ -352,9 +355,10 @@ void CConfigureDlg::OnExclude()
         ShowError(FormatString(Str::FolderOutsideSearchArea, {folder, area->name}), LoadString(Str::IncorrectParameter));
         return;
     }
-    const bool excluded = std::any_of(area->excluded.begin(), area->excluded.end(), [&folder](const auto &entry) {
-        return EqualsNoCase(WithoutTrailingSeparator(entry.second), folder);
-    });
+    const bool excluded =
+        std::any_of(area->excluded.begin(), area->excluded.end(), [&folder](const ExclusionMap::Entry &entry) {
+            return EqualsNoCase(WithoutTrailingSeparator(entry.absolute), folder);
+        });
     if (excluded) {
         ShowError(FormatString(Str::FolderAlreadyExcluded, folder), LoadString(Str::IncorrectParameter));
         return;
@@ -370,7 +374,7 @@ void CConfigureDlg::OnExclude()
             return;
         m_modified = true;
     }
-    area->excluded.emplace(relative, folder);
+    area->excluded.Add(relative, folder);
     QTreeWidgetItem *item = AddExcludedItem(*areaItem, relative, true);
     areaItem->setExpanded(true);
     Tree().Select(item);
@@ -394,10 +398,7 @@ void CConfigureDlg::OnRemove()
             editor.RemoveFolder(FromQString(path), 1, status);
         });
     } else {
-        const auto found = area->excluded.find(selected->text(0));
-        const QString absolute = found != area->excluded.end() ? found->second : QString();
-        if (found != area->excluded.end())
-            area->excluded.erase(found);
+        const QString absolute = area->excluded.Erase(selected->text(0));
         delete selected;
         m_modified = true;
         if (!absolute.isEmpty()) {
@@ -469,8 +470,8 @@ void CConfigureDlg::OnExplore()
         return;
     QString folder = area->clientPath;
     if (!CConMenuCTreeCtrl::IsSearchArea(*selected)) {
-        const auto found = area->excluded.find(selected->text(0));
-        folder = found != area->excluded.end() ? found->second : QString();
+        const QString *absolute = area->excluded.Find(selected->text(0));
+        folder = absolute ? *absolute : QString();
     }
     if (!m_startProcess(QStringLiteral("xdg-open"), {folder}))
         Ask({LoadString(Str::ExploreError), LoadString(Str::ServerError), MessageIcon::None, MessageButtons::Ok});
@@ -483,8 +484,8 @@ QString CConfigureDlg::InfoTip(const QTreeWidgetItem &item) const
         return QString();
     if (CConMenuCTreeCtrl::IsSearchArea(item))
         return area->path;
-    const auto found = area->excluded.find(item.text(0));
-    return found != area->excluded.end() ? found->second : QString();
+    const QString *absolute = area->excluded.Find(item.text(0));
+    return absolute ? *absolute : QString();
 }
 
 bool CConfigureDlg::SavePage()

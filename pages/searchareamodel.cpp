@@ -7,15 +7,65 @@
 #include "sorvik/vekexception.h"
 #include "sorvik/wstringqt.h"
 
+#include <algorithm>
+
 namespace pages {
 
 namespace serverlibs = cv::vek::rovo::serverlibs;
 using cv::krn::ToQString;
 using cv::krn::ToView;
 
-bool NoCaseLess::operator()(const QString &a, const QString &b) const
+namespace {
+
+std::u16string_view View(QStringView text)
 {
-    return cv::krn::CompareNoCase(ToView(a), ToView(b)) < 0;
+    return std::u16string_view(text.utf16(), std::size_t(text.size()));
+}
+
+} // namespace
+
+bool NoCaseLess::operator()(QStringView a, QStringView b) const
+{
+    return cv::krn::CompareNoCase(View(a), View(b)) < 0;
+}
+
+namespace {
+
+// The first entry whose name is not before relative (const or not).
+template <typename Entries>
+auto LowerBound(Entries &entries, QStringView relative)
+{
+    return std::lower_bound(entries.begin(), entries.end(), relative,
+                            [](const ExclusionMap::Entry &entry, QStringView key) {
+                                return NoCaseLess()(entry.relative, key);
+                            });
+}
+
+} // namespace
+
+bool ExclusionMap::Add(const QString &relative, const QString &absolute)
+{
+    const auto at = LowerBound(m_entries, relative);
+    if (at != m_entries.end() && !NoCaseLess()(relative, at->relative))
+        return false;
+    m_entries.insert(at, Entry{relative, absolute});
+    return true;
+}
+
+const QString *ExclusionMap::Find(QStringView relative) const
+{
+    const auto at = LowerBound(m_entries, relative);
+    return at != m_entries.end() && !NoCaseLess()(relative, at->relative) ? &at->absolute : nullptr;
+}
+
+QString ExclusionMap::Erase(QStringView relative)
+{
+    const auto at = LowerBound(m_entries, relative);
+    if (at == m_entries.end() || NoCaseLess()(relative, at->relative))
+        return QString();
+    QString absolute = std::move(at->absolute);
+    m_entries.erase(at);
+    return absolute;
 }
 
 bool EqualsNoCase(const QString &a, const QString &b)
@@ -49,9 +99,10 @@ std::int32_t LoadSearchAreas(cv::rovo::IConfigurationView &view, SearchAreaList 
             area.name = ToQString(names.alias);
             area.displayText = area.name;
             const auto excluded = serverlibs::ListExcludedFolders(view, path);
+            area.excluded.Reserve(serverlibs::Texts(excluded.get()).size());
             for (const cv::krn::WString &folder : serverlibs::Texts(excluded.get())) {
                 const QString absolute = ToQString(folder);
-                area.excluded.emplace(RelativeName(absolute, area.path), absolute);
+                area.excluded.Add(RelativeName(absolute, area.path), absolute);
             }
             areas.push_back(std::move(area));
         }

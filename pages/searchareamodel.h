@@ -10,7 +10,6 @@
 #include <QString>
 
 #include <cstdint>
-#include <map>
 #include <vector>
 
 class QTreeWidgetItem;
@@ -19,7 +18,7 @@ namespace pages {
 
 struct NoCaseLess
 {
-    bool operator()(const QString &a, const QString &b) const;
+    bool operator()(QStringView a, QStringView b) const;
 };
 
 bool EqualsNoCase(const QString &a, const QString &b);
@@ -28,8 +27,32 @@ bool EqualsNoCase(const QString &a, const QString &b);
 bool IsInside(const QString &inner, const QString &outer);
 
 // Excluded folders: the path below the search area (no leading or trailing
-// separator) to the absolute path.
-using ExclusionMap = std::map<QString, QString, NoCaseLess>;
+// separator) to the absolute path, ordered by NoCaseLess. A sorted array:
+// a search area has a handful, and thousands of areas load at once.
+class ExclusionMap
+{
+public:
+    struct Entry
+    {
+        QString relative;
+        QString absolute;
+    };
+
+    // False when relative is there already; it keeps its absolute path.
+    bool Add(const QString &relative, const QString &absolute);
+    // The absolute path of relative, or null.
+    const QString *Find(QStringView relative) const;
+    // The absolute path of relative, which is no longer there; empty when it never was.
+    QString Erase(QStringView relative);
+
+    void Reserve(std::size_t count) { m_entries.reserve(count); }
+    std::size_t Size() const { return m_entries.size(); }
+    std::vector<Entry>::const_iterator begin() const { return m_entries.begin(); }
+    std::vector<Entry>::const_iterator end() const { return m_entries.end(); }
+
+private:
+    std::vector<Entry> m_entries;
+};
 
 struct SearchAreaRecord
 {
