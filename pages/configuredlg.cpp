@@ -123,6 +123,9 @@ bool CConfigureDlg::OnInitDialog()
 std::int32_t CConfigureDlg::Reload()
 {
     m_modified = false;
+    // The old items go first: the load reuses their memory, and the old and
+    // new search areas are never held twice.
+    Tree().clear();
     std::int32_t result = 0;
     if (m_view) {
         sharedsource::CWaitCursor busy;
