@@ -123,8 +123,8 @@ bool CConfigureDlg::OnInitDialog()
 std::int32_t CConfigureDlg::Reload()
 {
     m_modified = false;
-    // The old items go first: the load reuses their memory, and the old and
-    // new search areas are never held twice.
+    // The old items go first, so that the old tree and the new list are
+    // never in memory together.
     Tree().clear();
     std::int32_t result = 0;
     if (m_view) {
