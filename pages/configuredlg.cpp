@@ -355,7 +355,8 @@ void CConfigureDlg::OnExclude()
     // Typed into the browser's edit box, a folder may lie anywhere; one
     // outside the search area would make the whole commit fail.
     if (!IsInside(folder, area->path)) {
-        ShowError(FormatString(Str::FolderOutsideSearchArea, {folder, area->name}), LoadString(Str::IncorrectParameter));
+        ShowError(FormatString(Str::FolderOutsideSearchArea, {folder, area->name}),
+                  LoadString(Str::IncorrectParameter));
         return;
     }
     const bool excluded =
@@ -509,8 +510,7 @@ bool CConfigureDlg::SavePage()
         cv::vek::CallWithStatus([&](std::int32_t *status) {
             container->AssignFromArray(paths.data(), std::uint32_t(paths.size()), status);
         });
-        cv::vek::CallWithStatus(
-            [&](std::int32_t *status) { m_editor->SetSearchAreaOrder(container.get(), status); });
+        cv::vek::CallWithStatus([&](std::int32_t *status) { m_editor->SetSearchAreaOrder(container.get(), status); });
     } catch (const cv::vek::Exception &) {
         return false;
     }

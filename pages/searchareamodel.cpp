@@ -22,26 +22,21 @@ std::u16string_view View(QStringView text)
     return std::u16string_view(text.utf16(), std::size_t(text.size()));
 }
 
+// The first entry whose name is not before relative (const or not).
+template <typename Entries>
+auto LowerBound(Entries &entries, QStringView relative)
+{
+    return std::lower_bound(
+        entries.begin(), entries.end(), relative,
+        [](const ExclusionMap::Entry &entry, QStringView key) { return NoCaseLess()(entry.relative, key); });
+}
+
 } // namespace
 
 bool NoCaseLess::operator()(QStringView a, QStringView b) const
 {
     return cv::krn::CompareNoCase(View(a), View(b)) < 0;
 }
-
-namespace {
-
-// The first entry whose name is not before relative (const or not).
-template <typename Entries>
-auto LowerBound(Entries &entries, QStringView relative)
-{
-    return std::lower_bound(entries.begin(), entries.end(), relative,
-                            [](const ExclusionMap::Entry &entry, QStringView key) {
-                                return NoCaseLess()(entry.relative, key);
-                            });
-}
-
-} // namespace
 
 bool ExclusionMap::Add(const QString &relative, const QString &absolute)
 {

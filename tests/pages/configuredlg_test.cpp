@@ -28,12 +28,9 @@ using sharedsource::MessageResult;
 using uitest::BoxLine;
 
 const std::vector<Folder> kThreeAreas = {
-    {u"/data/A", u"/data/A", u"Alpha"},
-    {u"/data/A/zeta", u"", u"zeta", true},
-    {u"/data/A/Beta", u"", u"Beta", true},
-    {u"/data/A/alpha", u"", u"alpha", true},
-    {u"/data/B", u"/data/B", u"Bravo"},
-    {u"/other", u"/mnt/other", u"Other"},
+    {u"/data/A", u"/data/A", u"Alpha"},    {u"/data/A/zeta", u"", u"zeta", true},
+    {u"/data/A/Beta", u"", u"Beta", true}, {u"/data/A/alpha", u"", u"alpha", true},
+    {u"/data/B", u"/data/B", u"Bravo"},    {u"/other", u"/mnt/other", u"Other"},
 };
 
 std::string InputError(Str text, const QString &argument)
@@ -100,8 +97,7 @@ TEST_F(SearchAreas, LoadShowsAreasInOrderAndExclusionsSortedIgnoringCase)
 
 TEST_F(SearchAreas, RelativeNamesOfExcludedFolders)
 {
-    EXPECT_EQ(pages::RelativeName(QStringLiteral("C:\\Data\\Old\\"), QStringLiteral("C:\\Data")),
-              QStringLiteral("Old"))
+    EXPECT_EQ(pages::RelativeName(QStringLiteral("C:\\Data\\Old\\"), QStringLiteral("C:\\Data")), QStringLiteral("Old"))
         << "a folder stored with a trailing separator";
     EXPECT_EQ(pages::RelativeName(QStringLiteral("/data/a/b/"), QStringLiteral("/data")), QStringLiteral("a/b"));
     EXPECT_EQ(pages::RelativeName(QStringLiteral("/x"), QStringLiteral("/data/long")), QString())
@@ -146,8 +142,7 @@ TEST_F(SearchAreas, QuestionsOfTheAddDialogAreAnsweredFromThePage)
     EXPECT_EQ(tester.CheckPathAllowed(cv::krn::WString(u"/new"), cv::krn::WString(u"/cnew"), cv::krn::WString(u"N")),
               0);
     m_log->failures["CheckAreaAllowed"] = cv::rovo::status::StoreUnavailable;
-    EXPECT_EQ(tester.CheckPathAllowed(cv::krn::WString(u"/new"), cv::krn::WString(u"/cnew"), cv::krn::WString(u"N")),
-              0)
+    EXPECT_EQ(tester.CheckPathAllowed(cv::krn::WString(u"/new"), cv::krn::WString(u"/cnew"), cv::krn::WString(u"N")), 0)
         << "a failed question allows; the commit checks again";
     EXPECT_EQ(m_log->Only({"CheckAreaAllowed"}),
               (Lines{"CheckAreaAllowed /new | /cnew | N", "CheckAreaAllowed /new | /cnew | N"}));
@@ -182,23 +177,21 @@ TEST_F(SearchAreas, AbsorbedExclusionsArePlacedByThePathThatMatched)
                                        {u"/elsewhere/B", u"/mnt/share/B", u"B"},
                                        {u"/elsewhere/B/Old", u"", u"Old", true}});
     page.InsertSearchArea(QStringLiteral("/srv/data"), QStringLiteral("Data"), QStringLiteral("/mnt/share"));
-    EXPECT_EQ(EditorCalls(),
-              (Lines{"AddFolder /srv/data | /mnt/share | Data | 1 | 0", "RemoveFolder /srv/data/A | 1",
-                     "AddFolder /srv/data/A/Tmp |  | A/Tmp | 0 | 1", "RemoveFolder /elsewhere/B | 1",
-                     "AddFolder /srv/data/B/Old |  | B/Old | 0 | 1"}));
+    EXPECT_EQ(EditorCalls(), (Lines{"AddFolder /srv/data | /mnt/share | Data | 1 | 0", "RemoveFolder /srv/data/A | 1",
+                                    "AddFolder /srv/data/A/Tmp |  | A/Tmp | 0 | 1", "RemoveFolder /elsewhere/B | 1",
+                                    "AddFolder /srv/data/B/Old |  | B/Old | 0 | 1"}));
     EXPECT_EQ(TreeLines(), (Lines{"Data", "  A/Tmp", "  B/Old"}));
     Commit();
-    EXPECT_EQ(Snapshot(), (Lines{"/srv/data | /mnt/share | Data", "  /srv/data/A/Tmp | A/Tmp",
-                                 "  /srv/data/B/Old | B/Old"}));
+    EXPECT_EQ(Snapshot(),
+              (Lines{"/srv/data | /mnt/share | Data", "  /srv/data/A/Tmp | A/Tmp", "  /srv/data/B/Old | B/Old"}));
 }
 
 TEST_F(SearchAreas, RemovingAsksForSearchAreasOnly)
 {
     pages::CConfigureDlg &page = Open(kThreeAreas);
     const auto question = [](const char *name) {
-        return BoxLine(LoadString(Str::Warning),
-                       FormatString(Str::RemoveSearchAreaQuestion, QString::fromLatin1(name)), "warning",
-                       "ok-cancel");
+        return BoxLine(LoadString(Str::Warning), FormatString(Str::RemoveSearchAreaQuestion, QString::fromLatin1(name)),
+                       "warning", "ok-cancel");
     };
     Select(Area(0));
     m_prompts.answers = {MessageResult::Cancel};
@@ -252,9 +245,9 @@ TEST_F(SearchAreas, ReorderingWritesTheWholeOrderOnceWhenSaved)
     EXPECT_TRUE(page.SavePage());
     EXPECT_EQ(EditorCalls(), Lines{"SetSearchAreaOrder /data/B,/other,/data/A"});
     Commit();
-    EXPECT_EQ(Snapshot(), (Lines{"/data/B | /data/B | Bravo", "/other | /mnt/other | Other",
-                                 "/data/A | /data/A | Alpha", "  /data/A/zeta | zeta", "  /data/A/Beta | Beta",
-                                 "  /data/A/alpha | alpha"}));
+    EXPECT_EQ(Snapshot(),
+              (Lines{"/data/B | /data/B | Bravo", "/other | /mnt/other | Other", "/data/A | /data/A | Alpha",
+                     "  /data/A/zeta | zeta", "  /data/A/Beta | Beta", "  /data/A/alpha | alpha"}));
 }
 
 TEST_F(SearchAreas, RenamesAreCheckedAgainstTheOtherNames)

@@ -38,7 +38,7 @@ const std::vector<Folder> kAreas = {
 std::vector<std::string> Entries(const char *states)
 {
     const Str texts[] = {Str::AddSearchAreaMenu, Str::ExcludeSubfolderMenu, Str::RemoveMenu, Str::UpMenu,
-                         Str::DownMenu, Str::RenameMenu, Str::ExploreMenu};
+                         Str::DownMenu,          Str::RenameMenu,           Str::ExploreMenu};
     std::vector<std::string> entries;
     for (int i = 0; i < 7; ++i) {
         if (i == 5 || i == 6)
@@ -194,9 +194,9 @@ TEST_F(SearchAreaTree, ExcludingASubfolder)
     EXPECT_EQ(Area(2)->childCount(), 0) << "what the editor refused is not shown";
 
     Commit();
-    EXPECT_EQ(Snapshot(), (Lines{"/data/A | /client/A | Alpha", "  /data/A/Tmp | Tmp", "  /data/A/Tmp/deeper | Tmp/deeper",
-                                 "  /data/A/new | new", "  /data/A/Me | Me", "/data/B | /client/B | Bravo",
-                                 "/data/C | /client/C | Charlie"}));
+    EXPECT_EQ(Snapshot(), (Lines{"/data/A | /client/A | Alpha", "  /data/A/Tmp | Tmp",
+                                 "  /data/A/Tmp/deeper | Tmp/deeper", "  /data/A/new | new", "  /data/A/Me | Me",
+                                 "/data/B | /client/B | Bravo", "/data/C | /client/C | Charlie"}));
 }
 
 TEST_F(SearchAreaTree, ExploreOpensTheFolderOrSaysWhyNot)

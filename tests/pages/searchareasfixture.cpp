@@ -132,8 +132,8 @@ std::string SearchAreasPage::Buttons() const
 {
     using namespace resources;
     std::string states;
-    for (int command : {ID_ADD_SEARCH_AREA, ID_EXCLUDE_SUBFOLDER, ID_REMOVE_SEARCH_AREA, ID_SEARCH_AREA_UP,
-                        ID_SEARCH_AREA_DOWN})
+    for (int command :
+         {ID_ADD_SEARCH_AREA, ID_EXCLUDE_SUBFOLDER, ID_REMOVE_SEARCH_AREA, ID_SEARCH_AREA_UP, ID_SEARCH_AREA_DOWN})
         states += m_page->ToolBar()->IsButtonEnabled(command) ? '1' : '0';
     return states;
 }
