@@ -180,7 +180,8 @@ bool RequestorBase::StartServerIfNeeded()
     }
 
     m_log.Info(__FILE__, __LINE__, kStartVerbosity) << "SKCP:     Sorvik is not running so we try to start it!";
-    if (!krn::osdep::StartDetachedProcess(krn::ToUtf8(dunemere::ServerExecutablePath())))
+    if (!krn::osdep::StartDetachedProcess(krn::ToUtf8(dunemere::ServerExecutablePath()),
+                                           dunemere::StartedServerLogPath()))
         throw DataCache::ToIntMsgDa(kSource, 65,
                                     u"PLUGIN: Sorvik is not running and the plugin is not able to start it!");
     m_serverStartedAt = std::chrono::steady_clock::now();
