@@ -11,6 +11,8 @@
 #include <sys/uio.h>
 #include <unistd.h>
 
+#include <utility>
+
 namespace cv::vek::rovo::comm {
 
 namespace {
@@ -131,6 +133,7 @@ std::uint32_t FramedSocket::Send(std::span<const std::uint8_t> record, std::uint
             next->iov_len -= left;
         }
     }
+    m_sentLast = true;
     return kResultOk;
 }
 
@@ -182,7 +185,19 @@ std::uint32_t FramedSocket::Receive(krn::ByteBuffer &record, std::uint32_t timeo
         return kResultConnectionLost;
 
     const Deadline deadline(timeoutMs);
+    // Right after a send a caller that may wait usually waits for the answer:
+    // waiting first saves the read that would only find nothing.
+    bool waitFirst = std::exchange(m_sentLast, false) && timeoutMs != 0 && m_headerBytes == 0
+        && m_readAheadBegin == m_readAheadEnd;
     for (;;) {
+        if (waitFirst) {
+            waitFirst = false;
+            const Wait wait = WaitFor(m_fd, POLLIN, deadline);
+            if (wait == Wait::Failed)
+                return FailWithErrno(errno);
+            if (wait == Wait::TimedOut)
+                return kResultTimeout;
+        }
         if (!TakeReadAhead())
             return Fail(kResultFrameTooLarge);
         if (FrameComplete()) {

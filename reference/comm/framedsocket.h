@@ -61,6 +61,8 @@ private:
     std::uint8_t m_readAhead[kReadAheadBytes];
     std::size_t m_readAheadBegin = 0;
     std::size_t m_readAheadEnd = 0;
+    // The last operation was a send: the answer to it is rarely there yet.
+    bool m_sentLast = false;
 };
 
 } // namespace cv::vek::rovo::comm
