@@ -37,14 +37,19 @@ public:
 class Gallery
 {
 public:
-    Gallery(const QString &folder, const LOGFONTW *font) : m_folder(folder), m_font(font) {}
+    Gallery(const QString &folder, const LOGFONTW *font) : m_folder(folder)
+    {
+        if (font)
+            m_host.font = *font;
+    }
 
     void SearchArea(const QString &file, bool editMode, QSize growth = {})
     {
         NoSearchAreas tester;
         const QString path = QStringLiteral("/srv/data/Projects");
         pages::CAddSearchAreaDlg dialog(editMode ? QStringLiteral("Projects") : QString(), path,
-                                        editMode ? path : QString(), tester, editMode, nullptr, 0, m_font);
+                                        editMode ? path : QString(), tester, editMode);
+        dialog.SetHostSettings(m_host);
         if (dialog.CreateModeless(nullptr) == 1) {
             dialog.resize(dialog.size() + growth);
             Save(dialog, file);
@@ -53,7 +58,8 @@ public:
 
     void Triggers(const QString &file, std::int32_t trigger)
     {
-        pages::CIndexMonitoringDlg dialog(trigger, nullptr, 0, m_font);
+        pages::CIndexMonitoringDlg dialog(trigger);
+        dialog.SetHostSettings(m_host);
         if (dialog.CreateModeless(nullptr) == 1)
             Save(dialog, file);
     }
@@ -90,7 +96,7 @@ private:
     }
 
     QString m_folder;
-    const LOGFONTW *m_font;
+    sharedsource::HostSettings m_host;
     QStringList m_written;
 };
 

@@ -1,19 +1,17 @@
 #pragma once
 
-#include "sorvik/logfont.h"
-#include "sorvik/serverdialogs.h"
+#include "sharedsource/hostsettings.h"
 
 #include <cstdint>
 
 namespace cv::vek::rovo {
 
-// What the host set on a service object and every dialog receives.
+// What the host set on a service object and every dialog receives: the
+// font and help every window gets, and whether a dialog waits for the
+// server after its commit.
 struct HostSettings
 {
-    SorvikHelpCallback helpCallback = nullptr; // null: no help offered
-    std::uintptr_t helpContext = 0;
-    LOGFONTW font{};
-    bool fontSet = false; // until the host sets a font, dialogs keep their template's
+    sharedsource::HostSettings window;
     std::int32_t waitFlag = 1;
 };
 

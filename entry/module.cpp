@@ -3,15 +3,16 @@
 #include "entry/errors/raiseerror.h"
 #include "entry/serverdialogs.h"
 
+#include <QCoreApplication>
+
 #include <new>
 
 namespace cv::vek::rovo {
 
 ModuleLifetime::ModuleLifetime(serverlibs::VekexLibrary &vekex, serverlibs::RovoApiLibrary &rovoApi,
-                               OpenDialogList &dialogs, CServerDialogsApp &app)
+                               sharedsource::OpenDialogList &dialogs, CServerDialogsApp &app)
     : m_vekex(vekex), m_rovoApi(rovoApi), m_dialogs(dialogs), m_app(app)
-{
-}
+{}
 
 void ModuleLifetime::Init()
 {
@@ -27,6 +28,10 @@ void ModuleLifetime::Cleanup()
     if (!m_starts.End())
         return;
     m_dialogs.CloseAll();
+    // Closed windows delete themselves later; they must go while the
+    // application and the libraries they hold are still there.
+    if (QCoreApplication::instance())
+        QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
     m_vekex.ReleaseUse();
     m_rovoApi.ReleaseUse();
     m_app.ExitInstance();
@@ -34,7 +39,7 @@ void ModuleLifetime::Cleanup()
 
 ModuleLifetime &Module()
 {
-    static ModuleLifetime module(serverlibs::Vekex(), serverlibs::RovoApi(), OpenDialogs(), TheApp());
+    static ModuleLifetime module(serverlibs::Vekex(), serverlibs::RovoApi(), sharedsource::OpenDialogs(), TheApp());
     return module;
 }
 
@@ -58,7 +63,7 @@ IServerDialogs *CreateServerDialogs(const char16_t *connection, std::uint32_t se
 
 HRESULT CanUnloadNow()
 {
-    return CServerDialogs::LiveObjects() == 0 && OpenDialogs().Count() == 0 ? S_OK : S_FALSE;
+    return CServerDialogs::LiveObjects() == 0 && sharedsource::OpenDialogs().Count() == 0 ? S_OK : S_FALSE;
 }
 
 } // namespace cv::vek::rovo

@@ -2,13 +2,13 @@
 
 // The module-wide start and end, and the logic behind the exported functions.
 
-#include "entry/opendialoglist.h"
 #include "entry/serverdialogsapp.h"
 #include "entry/serviceui.h"
 #include "entry/startcount.h"
 #include "serverlibs/rovoapilibrary.h"
 #include "serverlibs/searchareas.h"
 #include "serverlibs/vekexlibrary.h"
+#include "sharedsource/opendialoglist.h"
 #include "sorvik/com.h"
 #include "sorvik/serverdialogs.h"
 
@@ -19,15 +19,16 @@ namespace cv::vek::rovo {
 class ModuleLifetime final
 {
 public:
-    ModuleLifetime(serverlibs::VekexLibrary &vekex, serverlibs::RovoApiLibrary &rovoApi, OpenDialogList &dialogs,
-                   CServerDialogsApp &app);
+    ModuleLifetime(serverlibs::VekexLibrary &vekex, serverlibs::RovoApiLibrary &rovoApi,
+                   sharedsource::OpenDialogList &dialogs, CServerDialogsApp &app);
 
     // The first Init takes a use of the data-store library, then of the
     // server API library; whether they load shows only when they are called.
     void Init();
-    // The last Cleanup closes the open modeless windows, releases both
-    // libraries and ends the application the module made for itself (never
-    // a host's); a Cleanup without an Init does nothing.
+    // The last Cleanup closes the open modeless windows and lets their
+    // deletion run, releases both libraries and ends the application the
+    // module made for itself (never a host's); a Cleanup without an Init
+    // does nothing.
     void Cleanup();
 
     std::uint32_t Starts() const { return m_starts.Value(); }
@@ -35,7 +36,7 @@ public:
 private:
     serverlibs::VekexLibrary &m_vekex;
     serverlibs::RovoApiLibrary &m_rovoApi;
-    OpenDialogList &m_dialogs;
+    sharedsource::OpenDialogList &m_dialogs;
     CServerDialogsApp &m_app;
     StartCount m_starts;
 };

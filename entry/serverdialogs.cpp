@@ -59,16 +59,16 @@ ULONG CServerDialogs::Release()
 
 void CServerDialogs::SetHelpCallback(SorvikHelpCallback callback, std::uintptr_t context)
 {
-    m_settings.helpCallback = callback;
-    m_settings.helpContext = context;
+    m_settings.window.help = {callback, context};
 }
 
 void CServerDialogs::SetDialogFont(const LOGFONTW *font)
 {
     if (!font)
         return;
-    std::memcpy(&m_settings.font, font, sizeof(LOGFONTW));
-    m_settings.fontSet = true;
+    LOGFONTW copy;
+    std::memcpy(&copy, font, sizeof(LOGFONTW));
+    m_settings.window.font = copy;
 }
 
 std::int32_t CServerDialogs::ShowConfigurationDialog()

@@ -34,8 +34,8 @@ public:
         if (!TheApp().EnsureApplication())
             return kDialogNotCreated;
         pages::CAddSearchAreaDlg dialog(krn::ToQString(data.alias), krn::ToQString(data.path),
-                                        krn::ToQString(data.clientPath), tester, data.editMode, host.helpCallback,
-                                        host.helpContext, host.fontSet ? &host.font : nullptr);
+                                        krn::ToQString(data.clientPath), tester, data.editMode);
+        dialog.SetHostSettings(host.window);
         const std::int32_t result = dialog.DoModal();
         if (result == kModalOk) {
             data.alias = krn::FromQString(dialog.Name());

@@ -4,6 +4,7 @@
 #include "pages/pathprobe.h"
 #include "resources/strings.h"
 #include "resources/templates.h"
+#include "serverlibs/serverpaths.h"
 #include "sharedsource/imageset.h"
 #include "sorvik/wstringqt.h"
 
@@ -21,48 +22,33 @@ using sharedsource::MessageResult;
 
 namespace {
 
-bool IsSeparator(QChar c)
-{
-    return c == u'\\' || c == u'/';
-}
-
-bool HoldsSeparator(const QString &path)
-{
-    return path.contains(u'\\') || path.contains(u'/');
-}
+namespace serverlibs = cv::vek::rovo::serverlibs;
 
 // A folder without any separator is a bare drive ("D:"), which means its root.
 QString WithRootSeparator(const QString &path)
 {
-    return path.isEmpty() || HoldsSeparator(path) ? path : path + u'\\';
+    const bool holdsSeparator = path.contains(u'\\') || path.contains(u'/');
+    return path.isEmpty() || holdsSeparator ? path : path + u'\\';
 }
 
-QString WithoutTrailingSeparator(QString path)
+QString WithoutTrailingSeparator(const QString &path)
 {
-    if (path.size() > 1 && IsSeparator(path.back()))
-        path.chop(1);
-    return path;
+    return cv::krn::ToQString(serverlibs::WithoutTrailingSeparator(cv::krn::ToView(path)));
 }
 
 } // namespace
 
 CAddSearchAreaDlg::CAddSearchAreaDlg(const QString &name, const QString &serverPath, const QString &path,
-                                     IInputTester &tester, bool editMode, SorvikHelpCallback helpCallback,
-                                     std::uintptr_t helpContext, const LOGFONTW *hostFont, QWidget *parent)
-    : ToBaseDlg(resources::IDD_ADD_SEARCH_AREA, parent),
+                                     IInputTester &tester, bool editMode, QWidget *parent)
+    : ToBaseDlg(resources::kAddSearchAreaTemplate, parent),
       m_name(name),
       m_initialName(name),
       m_path(path),
       m_serverPath(WithRootSeparator(serverPath)),
       m_editMode(editMode),
       m_tester(tester),
-      m_help{helpCallback, helpContext},
-      m_prompts(&sharedsource::QtPrompts()),
       m_inspector(&FileSystemInspector())
 {
-    resources::RegisterDialogTemplates();
-    if (hostFont)
-        m_font = *hostFont;
     if (m_path.isEmpty() && !m_serverPath.isEmpty())
         m_path = m_serverPath;
     else
@@ -79,28 +65,33 @@ CAddSearchAreaDlg::CAddSearchAreaDlg(const QString &name, const QString &serverP
     AddConstraint(IDHELP, NSFlexHorizontallyFixed, NSFlexMoveDown);
 }
 
-bool CAddSearchAreaDlg::GetDialogFont(LOGFONTW &font) const
+std::u16string CAddSearchAreaDlg::HelpTopic() const
 {
-    if (!m_font)
-        return false;
-    font = *m_font;
-    return true;
+    return m_editMode ? kEditHelpTopic : kAddHelpTopic;
+}
+
+QLineEdit &CAddSearchAreaDlg::NameEdit() const
+{
+    return sharedsource::GetControl<QLineEdit>(this, resources::IDC_ALIAS);
+}
+
+QLineEdit &CAddSearchAreaDlg::PathEdit() const
+{
+    return sharedsource::GetControl<QLineEdit>(this, resources::IDC_PATH);
 }
 
 bool CAddSearchAreaDlg::OnInitDialog()
 {
     ToBaseDlg::OnInitDialog();
     setWindowIcon(sharedsource::LoadImage(QStringLiteral("searcharea"), logicalDpiY()));
-    if (auto *browse = sharedsource::FindControlAs<QAbstractButton>(this, resources::IDC_BROWSE))
-        connect(browse, &QAbstractButton::clicked, this, [this] { OnBrowse(); });
+    auto &browse = sharedsource::GetControl<QAbstractButton>(this, resources::IDC_BROWSE);
+    connect(&browse, &QAbstractButton::clicked, this, [this] { OnBrowse(); });
     if (!m_path.isEmpty() && m_name.isEmpty())
         m_name = DefaultAreaName(m_path, m_name, m_tester);
     if (m_editMode) {
         setWindowTitle(LoadString(Str::EditSearchAreaTitle));
-        if (auto *path = sharedsource::FindControlAs<QLineEdit>(this, resources::IDC_PATH))
-            path->setReadOnly(true);
-        if (QWidget *browse = sharedsource::FindControl(this, resources::IDC_BROWSE))
-            browse->setEnabled(false);
+        PathEdit().setReadOnly(true);
+        browse.setEnabled(false);
     }
     DataExchange(false);
     return true;
@@ -108,16 +99,12 @@ bool CAddSearchAreaDlg::OnInitDialog()
 
 bool CAddSearchAreaDlg::DataExchange(bool save)
 {
-    auto *name = sharedsource::FindControlAs<QLineEdit>(this, resources::IDC_ALIAS);
-    auto *path = sharedsource::FindControlAs<QLineEdit>(this, resources::IDC_PATH);
-    if (!name || !path)
-        return false;
     if (save) {
-        m_name = name->text();
-        m_path = path->text();
+        m_name = NameEdit().text();
+        m_path = PathEdit().text();
     } else {
-        name->setText(m_name);
-        path->setText(m_path);
+        NameEdit().setText(m_name);
+        PathEdit().setText(m_path);
     }
     return true;
 }
@@ -140,8 +127,8 @@ QString CAddSearchAreaDlg::Path() const
 void CAddSearchAreaDlg::OnBrowse()
 {
     DataExchange(true);
-    const std::optional<QString> chosen =
-        m_prompts->BrowseForFolder(this, LoadString(Str::SelectRepositoryPath), WithoutTrailingSeparator(m_path));
+    const std::optional<QString> chosen = Prompts().BrowseForFolder(
+        this, {LoadString(Str::SelectRepositoryPath), QString(), WithoutTrailingSeparator(m_path)});
     if (!chosen || *chosen == m_path)
         return;
     m_path = *chosen;
@@ -216,12 +203,7 @@ void CAddSearchAreaDlg::ShowInputError(const QString &text)
 MessageResult CAddSearchAreaDlg::Ask(const QString &text, const QString &caption, MessageIcon icon,
                                      MessageButtons buttons)
 {
-    return m_prompts->ShowMessage(this, sharedsource::Message{text, caption, icon, buttons});
-}
-
-void CAddSearchAreaDlg::OnHelp()
-{
-    sharedsource::ShowHelp(m_help, m_editMode ? kEditHelpTopic : kAddHelpTopic);
+    return CNSFlexDialog::Ask(sharedsource::Message{text, caption, icon, buttons});
 }
 
 } // namespace pages

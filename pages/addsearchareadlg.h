@@ -11,7 +11,7 @@
 
 #include <QString>
 
-#include <optional>
+class QLineEdit;
 
 namespace pages {
 
@@ -22,12 +22,10 @@ class CAddSearchAreaDlg final : public sharedsource::ToBaseDlg<CNSFlexDialog>
     Q_OBJECT
 
 public:
-    // hostFont null: the template's font size in the fallback face.
+    // The host's font and help come from the window around it, or from SetHostSettings.
     CAddSearchAreaDlg(const QString &name, const QString &serverPath, const QString &path, IInputTester &tester,
-                      bool editMode, SorvikHelpCallback helpCallback, std::uintptr_t helpContext,
-                      const LOGFONTW *hostFont, QWidget *parent = nullptr);
+                      bool editMode, QWidget *parent = nullptr);
 
-    void SetPrompts(sharedsource::IPrompts &prompts) { m_prompts = &prompts; }
     void SetPathInspector(IPathInspector &inspector) { m_inspector = &inspector; }
 
     // After OK: the entered name, or the default name of the path when empty.
@@ -40,13 +38,12 @@ public:
     static constexpr char16_t kAddHelpTopic[] = u"ROAM_SEARCH_ADD_SEARCHAREA_DIALOG";
     static constexpr char16_t kEditHelpTopic[] = u"ROAM_SEARCH_EDIT_SEARCHAREA_DIALOG";
 
-    bool GetDialogFont(LOGFONTW &font) const override;
+    std::u16string HelpTopic() const override;
     bool OnInitDialog() override;
 
 protected:
     bool DataExchange(bool save) override;
     bool OnApply(std::uintptr_t applyContext) override;
-    void OnHelp() override;
 
 private:
     void OnBrowse();
@@ -55,6 +52,8 @@ private:
     void ShowInputError(const QString &text);
     sharedsource::MessageResult Ask(const QString &text, const QString &caption, sharedsource::MessageIcon icon,
                                     sharedsource::MessageButtons buttons);
+    QLineEdit &NameEdit() const;
+    QLineEdit &PathEdit() const;
 
     QString m_name;
     QString m_initialName;
@@ -62,9 +61,6 @@ private:
     QString m_serverPath;
     bool m_editMode;
     IInputTester &m_tester;
-    sharedsource::HelpTarget m_help;
-    std::optional<LOGFONTW> m_font;
-    sharedsource::IPrompts *m_prompts;
     IPathInspector *m_inspector;
 };
 

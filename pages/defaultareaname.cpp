@@ -1,30 +1,24 @@
 #include "pages/defaultareaname.h"
 
+#include "serverlibs/serverpaths.h"
 #include "sorvik/serverdialogs.h"
 #include "sorvik/wstringqt.h"
 
 namespace pages {
 
-namespace {
-
-bool IsSeparator(QChar c)
-{
-    return c == u'\\' || c == u'/';
-}
-
-} // namespace
+namespace serverlibs = cv::vek::rovo::serverlibs;
 
 QString DefaultAreaName(const QString &path, const QString &currentName, IInputTester &tester)
 {
     if (path.isEmpty())
         return currentName;
     QString trimmed = path;
-    while (!trimmed.isEmpty() && IsSeparator(trimmed.back()))
+    while (!trimmed.isEmpty() && serverlibs::IsSeparator(trimmed.back().unicode()))
         trimmed.chop(1);
     if (trimmed.isEmpty())
         return path;
 
-    const QChar separator = trimmed.contains(u'\\') || !trimmed.contains(u'/') ? u'\\' : u'/';
+    const QChar separator = serverlibs::SeparatorOf(cv::krn::ToView(trimmed));
     qsizetype last = trimmed.lastIndexOf(separator);
     QString candidate = last < 0 ? trimmed : trimmed.mid(last + 1);
     while (tester.IsAliasInUse(cv::krn::FromQString(candidate))) {

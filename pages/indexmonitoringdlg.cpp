@@ -12,13 +12,10 @@ namespace pages {
 using resources::LoadString;
 using resources::Str;
 
-CIndexMonitoringDlg::CIndexMonitoringDlg(std::int32_t trigger, SorvikHelpCallback helpCallback,
-                                         std::uintptr_t helpContext, const LOGFONTW *hostFont)
-    : ToBaseDlg(resources::IDD_INDEX_MONITORING, nullptr), m_trigger(trigger), m_help{helpCallback, helpContext}
+CIndexMonitoringDlg::CIndexMonitoringDlg(std::int32_t trigger, QWidget *parent)
+    : ToBaseDlg(resources::kIndexMonitoringTemplate, parent), m_trigger(trigger)
 {
-    resources::RegisterDialogTemplates();
-    if (hostFont)
-        m_font = *hostFont;
+    SetHelpTopic(kHelpTopic);
     using namespace resources;
     AddConstraint(IDC_TRIGGER_NONE, NSFlexExpandRight, NSFlexVerticallyFixed);
     AddConstraint(IDC_TRIGGER_FILE_CHANGES, NSFlexExpandRight, NSFlexVerticallyFixed);
@@ -28,12 +25,9 @@ CIndexMonitoringDlg::CIndexMonitoringDlg(std::int32_t trigger, SorvikHelpCallbac
     AddConstraint(IDHELP, NSFlexHorizontallyFixed, NSFlexMoveDown);
 }
 
-bool CIndexMonitoringDlg::GetDialogFont(LOGFONTW &font) const
+QRadioButton &CIndexMonitoringDlg::Radio(int id) const
 {
-    if (!m_font)
-        return false;
-    font = *m_font;
-    return true;
+    return sharedsource::GetControl<QRadioButton>(this, id);
 }
 
 bool CIndexMonitoringDlg::OnInitDialog()
@@ -42,8 +36,7 @@ bool CIndexMonitoringDlg::OnInitDialog()
     setWindowIcon(sharedsource::LoadImage(QStringLiteral("application"), logicalDpiY()));
     // The explanation follows the buttons at once; the trigger only at OK.
     const auto follow = [this](int id, std::int32_t trigger) {
-        if (auto *radio = sharedsource::FindControlAs<QRadioButton>(this, id))
-            connect(radio, &QRadioButton::clicked, this, [this, trigger] { ShowExplanation(trigger); });
+        connect(&Radio(id), &QRadioButton::clicked, this, [this, trigger] { ShowExplanation(trigger); });
     };
     follow(resources::IDC_TRIGGER_NONE, 0);
     follow(resources::IDC_TRIGGER_FILE_CHANGES, 1);
@@ -54,28 +47,19 @@ bool CIndexMonitoringDlg::OnInitDialog()
 
 bool CIndexMonitoringDlg::DataExchange(bool save)
 {
-    auto *none = sharedsource::FindControlAs<QRadioButton>(this, resources::IDC_TRIGGER_NONE);
-    auto *changes = sharedsource::FindControlAs<QRadioButton>(this, resources::IDC_TRIGGER_FILE_CHANGES);
-    if (!none || !changes)
-        return false;
     if (save) {
-        m_trigger = changes->isChecked() ? 1 : 0;
+        m_trigger = Radio(resources::IDC_TRIGGER_FILE_CHANGES).isChecked() ? 1 : 0;
     } else {
-        none->setChecked(m_trigger == 0);
-        changes->setChecked(m_trigger != 0);
+        Radio(resources::IDC_TRIGGER_NONE).setChecked(m_trigger == 0);
+        Radio(resources::IDC_TRIGGER_FILE_CHANGES).setChecked(m_trigger != 0);
     }
     return true;
 }
 
 void CIndexMonitoringDlg::ShowExplanation(std::int32_t trigger)
 {
-    if (auto *text = sharedsource::FindControlAs<QLabel>(this, resources::IDC_TRIGGER_EXPLANATION))
-        text->setText(LoadString(trigger == 1 ? Str::TriggerImmediateExplanation : Str::TriggerScheduleExplanation));
-}
-
-void CIndexMonitoringDlg::OnHelp()
-{
-    sharedsource::ShowHelp(m_help, kHelpTopic);
+    sharedsource::GetControl<QLabel>(this, resources::IDC_TRIGGER_EXPLANATION)
+        .setText(LoadString(trigger == 1 ? Str::TriggerImmediateExplanation : Str::TriggerScheduleExplanation));
 }
 
 } // namespace pages

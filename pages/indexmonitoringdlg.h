@@ -7,7 +7,7 @@
 #include "sharedsource/basedlg.h"
 #include "sorvik/serverdialogs.h"
 
-#include <optional>
+class QRadioButton;
 
 namespace pages {
 
@@ -16,8 +16,8 @@ class CIndexMonitoringDlg final : public sharedsource::ToBaseDlg<CNSFlexDialog>
     Q_OBJECT
 
 public:
-    CIndexMonitoringDlg(std::int32_t trigger, SorvikHelpCallback helpCallback, std::uintptr_t helpContext,
-                        const LOGFONTW *hostFont);
+    // The host's font and help come from parent, or from SetHostSettings.
+    CIndexMonitoringDlg(std::int32_t trigger, QWidget *parent = nullptr);
 
     std::int32_t Trigger() const { return m_trigger; }
     // After OK: true when the index follows data file changes.
@@ -25,19 +25,16 @@ public:
 
     static constexpr char16_t kHelpTopic[] = u"ROAM_SEARCH_CRAWLER_CONTROL_DIALOG";
 
-    bool GetDialogFont(LOGFONTW &font) const override;
     bool OnInitDialog() override;
 
 protected:
     bool DataExchange(bool save) override;
-    void OnHelp() override;
 
 private:
     void ShowExplanation(std::int32_t trigger);
+    QRadioButton &Radio(int id) const;
 
     std::int32_t m_trigger;
-    sharedsource::HelpTarget m_help;
-    std::optional<LOGFONTW> m_font;
 };
 
 } // namespace pages

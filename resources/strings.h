@@ -1,10 +1,13 @@
 #pragma once
 
 // The module's string table: every text a user sees, translated through
-// Qt's translation machinery (context "ServerDialogs"). Texts with a
-// placeholder take it as %1.
+// Qt's translation machinery (context "ServerDialogs"). Placeholders are
+// numbered: %1s or %1d (the letter says what goes there, for translators),
+// %2s, %2d and so on.
 
 #include <QString>
+
+#include <initializer_list>
 
 namespace resources {
 
@@ -19,6 +22,7 @@ enum class Str
     UnknownError,
     UpdateTimedOut,
     IncorrectParameter,
+    EnterIntegerBetween,
 
     AddSearchAreaTitle,
     EditSearchAreaTitle,
@@ -50,7 +54,10 @@ enum class Str
 };
 
 QString LoadString(Str id);
-// LoadString(id) with %1 replaced by argument (taken literally).
+// LoadString(id) with its placeholders %1, %2, ... (each optionally followed
+// by its type letter s or d) replaced by the arguments in order. Arguments
+// are taken literally: a path holding "%1" stays as it is.
+QString FormatString(Str id, std::initializer_list<QString> arguments);
 QString FormatString(Str id, const QString &argument);
 
 // The untranslated source text of an entry.

@@ -2,8 +2,6 @@
 
 #include "resources/strings.h"
 
-#include <mutex>
-
 namespace resources {
 
 using sharedsource::ControlKind;
@@ -64,15 +62,6 @@ DialogTemplate IndexMonitoringTemplate()
     };
     AddStandardButtons(dialog, 82, 64);
     return dialog;
-}
-
-void RegisterDialogTemplates()
-{
-    static std::once_flag registered;
-    std::call_once(registered, [] {
-        sharedsource::RegisterDialogTemplate(IDD_ADD_SEARCH_AREA, &AddSearchAreaTemplate);
-        sharedsource::RegisterDialogTemplate(IDD_INDEX_MONITORING, &IndexMonitoringTemplate);
-    });
 }
 
 } // namespace resources

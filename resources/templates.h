@@ -10,7 +10,7 @@ namespace resources {
 sharedsource::DialogTemplate AddSearchAreaTemplate();
 sharedsource::DialogTemplate IndexMonitoringTemplate();
 
-// Makes every template of the module known to the toolkit (once).
-void RegisterDialogTemplates();
+inline constexpr sharedsource::TemplateRef kAddSearchAreaTemplate{IDD_ADD_SEARCH_AREA, &AddSearchAreaTemplate};
+inline constexpr sharedsource::TemplateRef kIndexMonitoringTemplate{IDD_INDEX_MONITORING, &IndexMonitoringTemplate};
 
 } // namespace resources

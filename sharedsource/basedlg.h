@@ -2,12 +2,14 @@
 
 // A dialog created from its template with the host's font in place of the
 // template's: the common base of the module's modal dialogs
-// (ToBaseDlg<CNSFlexDialog>) and of its tab pages
+// (ToBaseDlg<CNSFlexDialog>), its modeless windows and its tab pages
 // (ToBaseDlg<ToTabPageWnd<CNSFlexDialog>>).
 
 #include "sharedsource/dialogfont.h"
 #include "sharedsource/dialogtemplate.h"
 #include "sharedsource/flexdialog.h"
+
+#include <QTabWidget>
 
 #include <cstdint>
 #include <optional>
@@ -22,39 +24,44 @@ template <class Base>
 class ToBaseDlg : public Base
 {
 public:
-    ToBaseDlg(std::uint16_t templateId, QWidget *parent, std::uintptr_t applyContext = 0)
-        : Base(parent, applyContext), m_templateId(templateId), m_parent(parent)
-    {
-    }
+    ToBaseDlg(TemplateRef dialogTemplate, QWidget *parent, std::uintptr_t applyContext = 0)
+        : Base(parent, applyContext), m_template(dialogTemplate), m_parent(parent)
+    {}
 
     QWidget *ParentWindow() const { return m_parent; }
 
     // The template's resource name; none for a dialog without template.
     virtual std::optional<std::uint16_t> TemplateName() const
     {
-        return m_templateId ? std::optional<std::uint16_t>(m_templateId) : std::nullopt;
+        return m_template.id ? std::optional<std::uint16_t>(m_template.id) : std::nullopt;
     }
 
     // Builds the window from the template as a child of parent (a top-level
-    // window when parent is null) and shows it. 1, or kNoTemplateName, or
-    // kTemplateNotLoaded.
+    // window when parent is null); it shows unless its template is hidden.
+    // 1, or kNoTemplateName, or kTemplateNotLoaded.
     virtual int CreateModeless(QWidget *parent)
     {
-        const std::optional<std::uint16_t> name = TemplateName();
-        if (!name)
+        if (!TemplateName())
             return kNoTemplateName;
-        std::optional<DialogTemplate> prepared = PreparedTemplate(*name);
+        std::optional<DialogTemplate> prepared = PreparedTemplate();
         if (!prepared)
             return kTemplateNotLoaded;
         this->setParent(parent, parent ? Qt::Widget : Qt::Dialog);
         Realize(*prepared);
-        this->show();
+        if (prepared->visible)
+            this->show();
         return 1;
     }
 
-    // The font to build the dialog with; false keeps the template's size in
-    // the fallback face.
-    virtual bool GetDialogFont(LOGFONTW &) const { return false; }
+    // The font to build the dialog with: the host's, wherever it was set;
+    // false keeps the template's size in the fallback face.
+    virtual bool GetDialogFont(LOGFONTW &font) const
+    {
+        const std::optional<LOGFONTW> host = this->HostFont();
+        if (host)
+            font = *host;
+        return host.has_value();
+    }
     virtual void OnTemplate(DialogTemplate &) {}
     virtual void OnBeforeRun() {}
     virtual void OnAfterRun() {}
@@ -62,14 +69,13 @@ public:
     // kResultOk, kResultCancel, or kModalNotCreated when the template cannot be loaded.
     virtual int DoModal()
     {
-        const std::optional<std::uint16_t> name = TemplateName();
-        if (!name) {
+        if (!TemplateName()) {
             OnBeforeRun();
             const int result = this->exec();
             OnAfterRun();
             return result;
         }
-        std::optional<DialogTemplate> prepared = PreparedTemplate(*name);
+        std::optional<DialogTemplate> prepared = PreparedTemplate();
         if (!prepared)
             return kModalNotCreated;
         OnTemplate(*prepared);
@@ -80,28 +86,39 @@ public:
         return result;
     }
 
-    std::uint16_t TemplateId() const { return m_templateId; }
+    std::uint16_t TemplateId() const { return m_template.id; }
 
 private:
-    std::optional<DialogTemplate> PreparedTemplate(std::uint16_t name) const
+    std::optional<DialogTemplate> PreparedTemplate() const
     {
-        std::optional<DialogTemplate> loaded = LoadDialogTemplate(name);
-        if (!loaded)
+        if (!m_template.make)
             return std::nullopt;
+        DialogTemplate loaded = m_template.make();
         LOGFONTW font;
         const bool supplied = GetDialogFont(font);
-        SubstituteFont(*loaded, supplied ? &font : nullptr, this->logicalDpiY());
+        SubstituteFont(loaded, supplied ? &font : nullptr, this->logicalDpiY());
         return loaded;
     }
 
     void Realize(const DialogTemplate &prepared)
     {
-        BuildFromTemplate(*this, prepared);
+        BuildFromTemplate(*this, prepared,
+                          [this](const ControlTemplate &control) { return this->CreateCustomControl(control); });
         this->OnInitDialog();
     }
 
-    std::uint16_t m_templateId;
+    TemplateRef m_template;
     QWidget *m_parent;
 };
+
+// Builds page from its template inside tabs and adds it with title; the
+// index of the new tab, or -1 when the page could not be built.
+template <class Page>
+int AddTabPage(QTabWidget &tabs, Page &page, const QString &title)
+{
+    if (page.CreateModeless(&tabs) != 1)
+        return -1;
+    return tabs.addTab(&page, title);
+}
 
 } // namespace sharedsource

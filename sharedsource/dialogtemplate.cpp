@@ -1,6 +1,10 @@
 #include "sharedsource/dialogtemplate.h"
 
+#include "sharedsource/animation.h"
 #include "sharedsource/imageset.h"
+#include "sharedsource/reportlist.h"
+#include "sharedsource/spinedit.h"
+#include "sharedsource/tabctrl.h"
 
 #include <QButtonGroup>
 #include <QCheckBox>
@@ -11,20 +15,15 @@
 #include <QLineEdit>
 #include <QPushButton>
 #include <QRadioButton>
+#include <QHeaderView>
+#include <QTimeEdit>
 #include <QToolButton>
+#include <QTreeWidget>
 #include <QWidget>
-
-#include <map>
 
 namespace sharedsource {
 
 namespace {
-
-std::map<std::uint16_t, TemplateFactory> &Templates()
-{
-    static std::map<std::uint16_t, TemplateFactory> templates;
-    return templates;
-}
 
 int MulDiv(int value, int numerator, int denominator)
 {
@@ -33,7 +32,50 @@ int MulDiv(int value, int numerator, int denominator)
     return static_cast<int>(product >= 0 ? (product + half) / denominator : (product - half) / denominator);
 }
 
-QWidget *MakeControl(QWidget &dialog, const ControlTemplate &control, QButtonGroup *&radioGroup)
+QWidget *MakeReportList(QWidget &dialog, const ControlTemplate &control)
+{
+    auto *list = new ToReportList(&dialog);
+    list->SetColumns(control.items.isEmpty() ? QStringList{QString()} : control.items);
+    list->setHeaderHidden(control.styles & style::kNoHeader);
+    if (control.styles & style::kSingleSelection)
+        list->setSelectionMode(QAbstractItemView::SingleSelection);
+    return list;
+}
+
+QWidget *MakeTree(QWidget &dialog)
+{
+    auto *tree = new QTreeWidget(&dialog);
+    tree->setHeaderHidden(true);
+    tree->setColumnCount(1);
+    return tree;
+}
+
+QWidget *MakeTimePicker(QWidget &dialog)
+{
+    auto *picker = new QTimeEdit(&dialog);
+    picker->setDisplayFormat(QStringLiteral("HH:mm"));
+    return picker;
+}
+
+QWidget *MakeAnimation(QWidget &dialog, const ControlTemplate &control)
+{
+    auto *animation = new ToAnimation(&dialog);
+    if (!control.text.isEmpty())
+        animation->Open(control.text);
+    return animation;
+}
+
+QWidget *MakePlaceholder(QWidget &dialog)
+{
+    auto *placeholder = new QWidget(&dialog);
+    placeholder->setFocusPolicy(Qt::NoFocus);
+    placeholder->setAttribute(Qt::WA_TransparentForMouseEvents);
+    placeholder->hide();
+    return placeholder;
+}
+
+QWidget *MakeControl(QWidget &dialog, const ControlTemplate &control, QButtonGroup *&radioGroup,
+                     const CustomControlFactory &custom)
 {
     switch (control.kind) {
     case ControlKind::Label:
@@ -87,24 +129,41 @@ QWidget *MakeControl(QWidget &dialog, const ControlTemplate &control, QButtonGro
         button->setIconSize(image.size() / image.devicePixelRatio());
         return button;
     }
+    case ControlKind::ReportList:
+        return MakeReportList(dialog, control);
+    case ControlKind::Tree:
+        return MakeTree(dialog);
+    case ControlKind::SpinEdit:
+        return new ToSpinEdit(&dialog);
+    case ControlKind::TimePicker:
+        return MakeTimePicker(dialog);
+    case ControlKind::TabControl:
+        return new ToTabCtrl(&dialog);
+    case ControlKind::Animation:
+        return MakeAnimation(dialog, control);
+    case ControlKind::Placeholder:
+        return MakePlaceholder(dialog);
+    case ControlKind::Custom: {
+        QWidget *widget = custom ? custom(control) : nullptr;
+        if (!widget)
+            throw ControlError(QStringLiteral("dialog %1 makes no control for its entry %2")
+                                   .arg(dialog.metaObject()->className())
+                                   .arg(control.id)
+                                   .toStdString());
+        if (widget->parentWidget() != &dialog)
+            widget->setParent(&dialog);
+        return widget;
+    }
     }
     return new QWidget(&dialog);
 }
 
+bool TakesMnemonicOfLabel(ControlKind kind)
+{
+    return kind != ControlKind::Label && kind != ControlKind::Text && kind != ControlKind::Placeholder;
+}
+
 } // namespace
-
-void RegisterDialogTemplate(std::uint16_t id, TemplateFactory factory)
-{
-    Templates()[id] = factory;
-}
-
-std::optional<DialogTemplate> LoadDialogTemplate(std::uint16_t id)
-{
-    const auto found = Templates().find(id);
-    if (found == Templates().end())
-        return std::nullopt;
-    return found->second();
-}
 
 QRect DialogUnits::ToPixels(const QRect &units) const
 {
@@ -125,7 +184,7 @@ DialogUnits DialogUnitsOf(const QFont &font)
     return DialogUnits{(alphabet / 26 + 1) / 2, metrics.height()};
 }
 
-void BuildFromTemplate(QWidget &dialog, const DialogTemplate &dialogTemplate)
+void BuildFromTemplate(QWidget &dialog, const DialogTemplate &dialogTemplate, const CustomControlFactory &custom)
 {
     QFont font(dialogTemplate.fontFace);
     font.setPointSize(dialogTemplate.pointSize);
@@ -136,20 +195,22 @@ void BuildFromTemplate(QWidget &dialog, const DialogTemplate &dialogTemplate)
     QButtonGroup *radioGroup = nullptr;
     QLabel *pendingBuddy = nullptr;
     for (const ControlTemplate &control : dialogTemplate.controls) {
-        QWidget *widget = MakeControl(dialog, control, radioGroup);
+        QWidget *widget = MakeControl(dialog, control, radioGroup, custom);
         widget->setProperty(kControlIdProperty, control.id);
         widget->setObjectName(QStringLiteral("control%1").arg(control.id));
         if (!control.toolTip.isEmpty())
             widget->setToolTip(control.toolTip);
         if (control.styles & style::kDisabled)
             widget->setEnabled(false);
+        if (control.styles & style::kHidden)
+            widget->hide();
         QRect rect = units.ToPixels(control.rect);
         if (control.kind == ControlKind::ComboBox) {
             widget->setProperty(kDroppedHeightProperty, rect.height());
             rect.setHeight(widget->sizeHint().height());
         }
         widget->setGeometry(rect);
-        if (pendingBuddy && control.kind != ControlKind::Label && control.kind != ControlKind::Text)
+        if (pendingBuddy && TakesMnemonicOfLabel(control.kind))
             pendingBuddy->setBuddy(widget);
         pendingBuddy = control.kind == ControlKind::Label ? static_cast<QLabel *>(widget) : nullptr;
     }
@@ -166,6 +227,17 @@ QWidget *FindControl(const QWidget *dialog, int id)
             return child;
     }
     return nullptr;
+}
+
+void ThrowControlError(const QWidget *dialog, int id, const char *expected)
+{
+    const QWidget *control = FindControl(dialog, id);
+    const QString owner = dialog ? QString::fromLatin1(dialog->metaObject()->className()) : QStringLiteral("(none)");
+    const QString what =
+        control ? QStringLiteral("is a %1, not the %2 asked for")
+                      .arg(QString::fromLatin1(control->metaObject()->className()), QString::fromLatin1(expected))
+                : QStringLiteral("does not exist");
+    throw ControlError(QStringLiteral("control %1 of %2 %3").arg(id).arg(owner, what).toStdString());
 }
 
 int DroppedHeight(const QWidget &combo)

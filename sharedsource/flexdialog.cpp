@@ -1,7 +1,5 @@
 #include "sharedsource/flexdialog.h"
 
-#include "sharedsource/dialogtemplate.h"
-
 #include <QAbstractButton>
 #include <QKeyEvent>
 
@@ -9,8 +7,7 @@ using namespace sharedsource;
 
 CNSFlexDialog::CNSFlexDialog(QWidget *parent, std::uintptr_t applyContext)
     : QDialog(parent), m_constraints(this), m_applyContext(applyContext)
-{
-}
+{}
 
 CNSFlexDialog::~CNSFlexDialog() = default;
 
@@ -35,7 +32,7 @@ bool CNSFlexDialog::OnInitDialog()
     m_initialised = true;
 
     const auto wire = [this](int id, auto slot) {
-        if (auto *button = FindControlAs<QAbstractButton>(this, id))
+        if (auto *button = dynamic_cast<QAbstractButton *>(FindControl(this, id)))
             connect(button, &QAbstractButton::clicked, this, slot);
     };
     wire(IDOK, [this] { accept(); });
@@ -54,6 +51,13 @@ bool CNSFlexDialog::DataExchange(bool)
 bool CNSFlexDialog::OnApply(std::uintptr_t)
 {
     return true;
+}
+
+void CNSFlexDialog::OnHelp()
+{
+    const std::u16string topic = HelpTopic();
+    if (!topic.empty())
+        ShowHelp(Help(), topic);
 }
 
 void CNSFlexDialog::accept()
@@ -75,11 +79,86 @@ void CNSFlexDialog::OnApplyNow()
     SetModified(false);
 }
 
+void CNSFlexDialog::SetHostSettings(const HostSettings &settings)
+{
+    m_hostFont = settings.font;
+    m_help = settings.help;
+}
+
+void CNSFlexDialog::SetHostFont(const LOGFONTW &font)
+{
+    m_hostFont = font;
+}
+
+void CNSFlexDialog::SetHelpTarget(const HelpTarget &help)
+{
+    m_help = help;
+}
+
+void CNSFlexDialog::SetPrompts(IPrompts &prompts)
+{
+    m_prompts = &prompts;
+}
+
+const CNSFlexDialog *CNSFlexDialog::NearestWith(bool (*has)(const CNSFlexDialog &)) const
+{
+    for (const QWidget *w = this; w; w = w->parentWidget()) {
+        if (const auto *dialog = dynamic_cast<const CNSFlexDialog *>(w); dialog && has(*dialog))
+            return dialog;
+    }
+    return nullptr;
+}
+
+std::optional<LOGFONTW> CNSFlexDialog::HostFont() const
+{
+    const CNSFlexDialog *owner = NearestWith([](const CNSFlexDialog &d) { return d.m_hostFont.has_value(); });
+    return owner ? owner->m_hostFont : std::nullopt;
+}
+
+HelpTarget CNSFlexDialog::Help() const
+{
+    const CNSFlexDialog *owner = NearestWith([](const CNSFlexDialog &d) { return d.m_help.has_value(); });
+    return owner ? *owner->m_help : HelpTarget{};
+}
+
+IPrompts &CNSFlexDialog::Prompts() const
+{
+    const CNSFlexDialog *owner = NearestWith([](const CNSFlexDialog &d) { return d.m_prompts != nullptr; });
+    return owner ? *owner->m_prompts : QtPrompts();
+}
+
+MessageResult CNSFlexDialog::Ask(const Message &message)
+{
+    return Prompts().ShowMessage(this, message);
+}
+
+QWidget *CNSFlexDialog::CreateCustomControl(const ControlTemplate &)
+{
+    return nullptr;
+}
+
+void CNSFlexDialog::PlaceToolBar(ToToolBar &toolBar, int placeholderId, ToolBarPlacement placement)
+{
+    m_toolBars.push_back({&toolBar, placeholderId, placement});
+    PlaceToolBars();
+}
+
+void CNSFlexDialog::PlaceToolBars()
+{
+    for (const ToolBarPlace &place : m_toolBars) {
+        const QWidget *placeholder = FindControl(this, place.placeholderId);
+        if (place.toolBar && placeholder)
+            place.toolBar->Place(placeholder->geometry(), place.placement);
+    }
+}
+
 void CNSFlexDialog::resizeEvent(QResizeEvent *event)
 {
     QDialog::resizeEvent(event);
-    if (m_initialised && !isMinimized())
-        m_constraints.Resize(size());
+    if (!m_initialised || isMinimized())
+        return;
+    m_constraints.Resize(size());
+    PlaceToolBars();
 }
 
 void CNSFlexDialog::keyPressEvent(QKeyEvent *event)

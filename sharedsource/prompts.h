@@ -48,21 +48,35 @@ struct Message
     MessageButtons buttons = MessageButtons::Ok;
 };
 
+struct FolderRequest
+{
+    QString title;
+    QString root;   // the browser offers nothing outside it; empty: the whole file system
+    QString select; // shown selected when the browser opens
+};
+
 struct FileRequest
 {
+    bool save = false; // a save dialog that asks before replacing a file; else the file must exist
     QString caption;
     QString folder;
-    QString filter; // Qt's "Description (*.ext)" form
-    bool save = false;
+    QString defaultName;
+    QString defaultExtension; // added to a name typed without one, e.g. "skc"
+    // "Description|patterns|Description|patterns||", patterns separated by ';'
+    QString filter;
 };
+
+// Qt's form of a filter ("Description (*.a *.b);;..."); a description that
+// already names its patterns in parentheses stays as it is.
+QString QtFileFilter(const QString &filter);
 
 class IPrompts
 {
 public:
     virtual MessageResult ShowMessage(QWidget *owner, const Message &message) = 0;
     // The chosen folder, or nothing when the user cancelled.
-    virtual std::optional<QString> BrowseForFolder(QWidget *owner, const QString &title,
-                                                   const QString &startFolder) = 0;
+    virtual std::optional<QString> BrowseForFolder(QWidget *owner, const FolderRequest &request) = 0;
+    // The chosen file's full path, or nothing when the user cancelled.
     virtual std::optional<QString> ChooseFile(QWidget *owner, const FileRequest &request) = 0;
 
 protected:

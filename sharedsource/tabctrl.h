@@ -1,8 +1,10 @@
 #pragma once
 
 // The tab control that holds tab pages: whether its pages handle Tab and
-// Ctrl+Tab themselves, and page switching that skips disabled pages and
-// stops at both ends.
+// Ctrl+Tab themselves, page switching that skips disabled pages and stops
+// at both ends, and a leave check before every change of page the user
+// asks for (a click on a tab, the keys of the tab strip, Ctrl+Tab and
+// Ctrl+Shift+Tab, Ctrl+PageUp and Ctrl+PageDown, the mouse wheel).
 
 #include <QTabWidget>
 
@@ -20,11 +22,24 @@ public:
     void SetKeyboardSwitching(bool allows) { m_keyboardSwitching = allows; }
     bool AllowsKeyboardSwitching() const { return m_keyboardSwitching; }
 
-    // Selects the next (or previous) enabled page; false at either end.
-    // currentChanged is the selection-change notification.
+    // Selects the next (or previous) enabled page; false at either end or
+    // when the current page may not be left. currentChanged is the
+    // selection-change notification.
     bool SelectNextPage(bool backwards);
+    // Selects page index for the user: false when it is the current one,
+    // cannot be selected, or the current page may not be left.
+    bool RequestPage(int index);
+
+protected:
+    // Asked before the user leaves page index; false keeps it.
+    virtual bool CanLeavePage(int index);
+
+    void keyPressEvent(QKeyEvent *event) override;
+    bool eventFilter(QObject *watched, QEvent *event) override;
 
 private:
+    int NextEnabledPage(int from, int step) const;
+
     bool m_keyboardHandling = true;
     bool m_keyboardSwitching = true;
 };

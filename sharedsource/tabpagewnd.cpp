@@ -68,6 +68,23 @@ bool FocusNextControl(QWidget &page, QWidget *current)
     return tabs && LeaveTabCtrl(*tabs);
 }
 
+bool HandleDialogKey(QKeyEvent &event, DialogKeys keys)
+{
+    const bool enter = event.key() == Qt::Key_Return || event.key() == Qt::Key_Enter;
+    const bool escape = event.key() == Qt::Key_Escape;
+    if (event.key() == Qt::Key_F1) {
+        event.ignore();
+        return true;
+    }
+    if (!enter && !escape)
+        return false;
+    if (keys == DialogKeys::ReachDialog)
+        event.ignore();
+    else
+        event.accept();
+    return true;
+}
+
 bool HandleCtrlTab(QWidget &page, QKeyEvent &event)
 {
     const bool tab = event.key() == Qt::Key_Tab || event.key() == Qt::Key_Backtab;

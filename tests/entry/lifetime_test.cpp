@@ -1,6 +1,9 @@
 #include "entry/module.h"
 #include "entry/serverdialogsapp.h"
 #include "serverlibs/testlibraries.h"
+#include "sharedsource/basedlg.h"
+
+#include <QPointer>
 
 #include <gtest/gtest.h>
 
@@ -11,59 +14,23 @@ namespace cv::vek::rovo {
 namespace {
 
 using Names = std::vector<std::string>;
+using sharedsource::OpenDialogList;
 
-// A modeless window that unregisters itself, and if told another one, when it closes.
+// A modeless window that records its closing; it stays registered until it goes.
 class Window final : public INonModalDialog
 {
 public:
-    Window(OpenDialogList &list, Names &closed, std::string name) : m_list(list), m_closed(closed), m_name(name)
+    Window(sharedsource::OpenDialogList &list, Names &closed, std::string name)
+        : m_closed(closed), m_name(std::move(name)), m_entry(*this, list)
     {
-        m_list.Register(this, &m_position);
     }
-    ~Window() { Unregister(); }
-    void Close() override
-    {
-        m_closed.push_back(m_name);
-        if (alsoCloses)
-            alsoCloses->Unregister();
-        if (unregistersOnClose)
-            Unregister();
-    }
-    void Unregister()
-    {
-        if (std::exchange(m_registered, false))
-            m_list.Unregister(m_position);
-    }
-
-    Window *alsoCloses = nullptr;
-    bool unregistersOnClose = true;
+    void Close() override { m_closed.push_back(m_name); }
 
 private:
-    OpenDialogList &m_list;
     Names &m_closed;
     std::string m_name;
-    OpenDialogList::Position m_position;
-    bool m_registered = true;
+    sharedsource::OpenDialogEntry m_entry;
 };
-
-TEST(OpenDialogList, ClosesTheNewestFirstAndSurvivesWindowsThatRemoveEntries)
-{
-    OpenDialogList list;
-    Names closed;
-    OpenDialogList::Position unused;
-    list.Register(nullptr, &unused);
-    Window a(list, closed, "a"), b(list, closed, "b"), c(list, closed, "c"), d(list, closed, "d");
-    list.Register(&a, nullptr);
-    EXPECT_EQ(list.Count(), 4u) << "null arguments register nothing";
-
-    d.alsoCloses = &c; // the entry after the one being closed goes too
-    b.unregistersOnClose = false;
-    list.CloseAll();
-    EXPECT_EQ(closed, (Names{"d", "b", "a"}));
-    EXPECT_EQ(list.Count(), 1u) << "b is still open";
-    b.Unregister();
-    EXPECT_EQ(list.Count(), 0u);
-}
 
 class ModuleLifetimeTest : public ::testing::Test
 {
@@ -104,6 +71,54 @@ TEST_F(ModuleLifetimeTest, LastCleanupEndsTheApplicationTheModuleMade)
     m_module.Cleanup();
     EXPECT_NE(QCoreApplication::instance(), nullptr);
     m_module.Cleanup();
+    EXPECT_EQ(QCoreApplication::instance(), nullptr);
+}
+
+sharedsource::DialogTemplate HiddenTemplate()
+{
+    sharedsource::DialogTemplate t;
+    t.id = 60030;
+    t.size = QSize(100, 40);
+    t.visible = false;
+    return t;
+}
+
+// A modeless window as the wait window is one: hidden until it shows
+// itself, registered while it exists, deleting itself when closed.
+class HiddenWindow final : public sharedsource::ToBaseDlg<CNSFlexDialog>, public INonModalDialog
+{
+public:
+    HiddenWindow(sharedsource::OpenDialogList &list, bool &applicationAtDeletion)
+        : ToBaseDlg({60030, &HiddenTemplate}, nullptr), m_entry(*this, list), m_applicationAtDeletion(applicationAtDeletion)
+    {
+    }
+    ~HiddenWindow() override { m_applicationAtDeletion = QCoreApplication::instance() != nullptr; }
+    void Close() override
+    {
+        done(sharedsource::kResultOk);
+        deleteLater();
+    }
+
+private:
+    sharedsource::OpenDialogEntry m_entry;
+    bool &m_applicationAtDeletion;
+};
+
+TEST_F(ModuleLifetimeTest, LastCleanupClosesHiddenWindowsAndDeletesThemBeforeTheApplicationEnds)
+{
+    ::setenv("QT_QPA_PLATFORM", "offscreen", 0);
+    m_module.Init();
+    ASSERT_NE(m_app.EnsureApplication(), nullptr);
+    bool applicationAtDeletion = false;
+    QPointer<HiddenWindow> window = new HiddenWindow(m_dialogs, applicationAtDeletion);
+    ASSERT_EQ(window->CreateModeless(nullptr), 1);
+    EXPECT_FALSE(window->isVisible()) << "its template is hidden";
+    EXPECT_EQ(m_dialogs.Count(), 1u);
+
+    m_module.Cleanup();
+    EXPECT_TRUE(window.isNull()) << "deleted by the last Cleanup";
+    EXPECT_TRUE(applicationAtDeletion) << "while the application still existed";
+    EXPECT_EQ(m_dialogs.Count(), 0u) << "it left the list on its way";
     EXPECT_EQ(QCoreApplication::instance(), nullptr);
 }
 

@@ -51,7 +51,8 @@ TEST_F(ServiceObject, SettersKeepWhatTheRulesAllow)
     m_service->SetDialogFont(&font);
     font.lfHeight = -20;               // the host's memory changes afterwards
     m_service->SetDialogFont(nullptr); // ignored
-    EXPECT_EQ(std::memcmp(&m_service->Settings().font, &sent, 92), 0);
+    ASSERT_TRUE(m_service->Settings().window.font);
+    EXPECT_EQ(std::memcmp(&*m_service->Settings().window.font, &sent, 92), 0);
 
     EXPECT_EQ(m_service->Settings().waitFlag, 1);
     m_service->SetWaitFlag(0);

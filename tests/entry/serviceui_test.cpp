@@ -5,6 +5,7 @@
 #include "entry/serverdialogsapp.h"
 #include "referencesorvik.h"
 #include "resources/resourceids.h"
+#include "resources/strings.h"
 #include "serverlibs/opensorvik.h"
 #include "uitest.h"
 
@@ -20,15 +21,11 @@
 namespace cv::vek::rovo::testing {
 namespace {
 
-using sharedsource::FindControlAs;
+using sharedsource::GetControl;
 
-const QString kExcludeQuestion = QStringLiteral(
-    "If you exclude a folder from the search areas, you can no longer search for data in this folder. Do you "
-    "really want to exclude the folder: %1?");
-const QString kRemoveQuestion = QStringLiteral(
-    "If you remove a search area, you can no longer search for data in this folder. Updating the index may take "
-    "some time and you will not be able to use the Sorvik during that time. Do you really want to remove the "
-    "search area: %1?");
+using resources::FormatString;
+using resources::LoadString;
+using resources::Str;
 
 // Checks a box as the user sees it, then presses one of its buttons.
 uitest::ModalPoller::Act Answer(QString caption, QString text, QMessageBox::Icon icon,
@@ -90,14 +87,14 @@ TEST_F(ModuleUi, AddRunsTheDialogAndMergesTheAreasInside)
     uitest::ModalPoller poller;
     poller.Expect("the dialog", uitest::Is<QDialog>(), [&](QWidget &w) {
         EXPECT_EQ(w.windowTitle(), QStringLiteral("Add Search Area"));
-        EXPECT_EQ(FindControlAs<QLineEdit>(&w, resources::IDC_PATH)->text().toStdString(), root);
-        EXPECT_EQ(FindControlAs<QLineEdit>(&w, resources::IDC_ALIAS)->text(), QStringLiteral("data"));
-        FindControlAs<QPushButton>(&w, resources::IDOK)->click();
+        EXPECT_EQ(GetControl<QLineEdit>(&w, resources::IDC_PATH).text().toStdString(), root);
+        EXPECT_EQ(GetControl<QLineEdit>(&w, resources::IDC_ALIAS).text(), QStringLiteral("data"));
+        GetControl<QPushButton>(&w, resources::IDOK).click();
     });
     poller.Expect("the contained areas", uitest::Is<QMessageBox>(), [](QWidget &w) {
         auto &box = static_cast<QMessageBox &>(w);
-        EXPECT_EQ(box.windowTitle(), QStringLiteral("Information"));
-        EXPECT_TRUE(box.text().startsWith(QStringLiteral("The specified path contains search areas.")));
+        EXPECT_EQ(box.windowTitle(), LoadString(Str::Information));
+        EXPECT_EQ(box.text(), LoadString(Str::PathContainsSearchAreas));
         box.button(QMessageBox::Ok)->click();
     });
     krn::WString path(data);
@@ -118,9 +115,9 @@ TEST_F(ModuleUi, EditShowsTheAreaInEditMode)
     uitest::ModalPoller poller;
     poller.Expect("the edit dialog", uitest::Is<QDialog>(), [](QWidget &w) {
         EXPECT_EQ(w.windowTitle(), QStringLiteral("Edit Search Area"));
-        EXPECT_EQ(FindControlAs<QLineEdit>(&w, resources::IDC_ALIAS)->text(), QStringLiteral("Alpha"));
-        FindControlAs<QLineEdit>(&w, resources::IDC_ALIAS)->setText(QStringLiteral("Renamed"));
-        FindControlAs<QPushButton>(&w, resources::IDOK)->click();
+        EXPECT_EQ(GetControl<QLineEdit>(&w, resources::IDC_ALIAS).text(), QStringLiteral("Alpha"));
+        GetControl<QLineEdit>(&w, resources::IDC_ALIAS).setText(QStringLiteral("Renamed"));
+        GetControl<QPushButton>(&w, resources::IDOK).click();
     });
     krn::WString path(a);
     EXPECT_EQ(m_service->EditSearchArea(path, 0), 1);
@@ -134,20 +131,20 @@ TEST_F(ModuleUi, ExcludeAndRemoveAskFirst)
     const QString cache = QString::fromStdU16String(data) + QStringLiteral("/cache");
     uitest::ModalPoller poller;
     poller.Expect("exclude, cancelled", uitest::Is<QMessageBox>(),
-                  Answer(QStringLiteral("Warning"), kExcludeQuestion.arg(cache), QMessageBox::Warning,
+                  Answer(LoadString(Str::Warning), FormatString(Str::ExcludeFolderQuestion, cache), QMessageBox::Warning,
                          QMessageBox::Ok | QMessageBox::Cancel, QMessageBox::Cancel));
     krn::WString path(cache.toStdU16String());
     EXPECT_EQ(m_service->ExcludeFolder(path), CServerDialogs::kDeclined);
     EXPECT_EQ(m_opened, 0) << "declining contacts no server";
 
     poller.Expect("exclude, confirmed", uitest::Is<QMessageBox>(),
-                  Answer(QStringLiteral("Warning"), kExcludeQuestion.arg(cache), QMessageBox::Warning,
+                  Answer(LoadString(Str::Warning), FormatString(Str::ExcludeFolderQuestion, cache), QMessageBox::Warning,
                          QMessageBox::Ok | QMessageBox::Cancel, QMessageBox::Ok));
     EXPECT_EQ(m_service->ExcludeFolder(path), CServerDialogs::kDone);
     EXPECT_EQ(m_service->RemoveSearchArea(path), CServerDialogs::kDone) << "an excluded folder goes unasked";
 
     poller.Expect("remove", uitest::Is<QMessageBox>(),
-                  Answer(QStringLiteral("Warning"), kRemoveQuestion.arg(QString::fromStdU16String(data)),
+                  Answer(LoadString(Str::Warning), FormatString(Str::RemoveSearchAreaQuestion, QString::fromStdU16String(data)),
                          QMessageBox::Warning, QMessageBox::Ok | QMessageBox::Cancel, QMessageBox::Ok));
     path = data;
     EXPECT_EQ(m_service->RemoveSearchArea(path), CServerDialogs::kDone);

@@ -2,6 +2,7 @@
 
 #include "pages/indexmonitoringdlg.h"
 #include "resources/resourceids.h"
+#include "resources/strings.h"
 #include "uitest.h"
 
 #include <QLabel>
@@ -17,17 +18,13 @@ namespace {
 
 using pages::CIndexMonitoringDlg;
 using sharedsource::FindControl;
-using sharedsource::FindControlAs;
+using sharedsource::GetControl;
 
-const QString kImmediate = QStringLiteral("Updates the index immediately when files are created or modified.");
-const QString kScheduled = QStringLiteral("Updates the index at the time specified in the scheduler.");
+using resources::LoadString;
+using resources::Str;
 
-std::u16string g_topic;
-
-void RecordHelp(BSTR topic, std::uintptr_t)
-{
-    g_topic.assign(topic, SysStringLen(topic));
-}
+const QString kImmediate = LoadString(Str::TriggerImmediateExplanation);
+const QString kScheduled = LoadString(Str::TriggerScheduleExplanation);
 
 class Triggers : public ::testing::Test
 {
@@ -35,7 +32,7 @@ protected:
     static void SetUpTestSuite() { uitest::Application(); }
     void TearDown() override { uitest::ExpectNoWindowsLeft(); }
 
-    static QRadioButton &Radio(QWidget &dialog, int id) { return *FindControlAs<QRadioButton>(&dialog, id); }
+    static QRadioButton &Radio(QWidget &dialog, int id) { return GetControl<QRadioButton>(&dialog, id); }
     // On the indicator: a radio button takes clicks on its indicator and label only.
     static void Click(QRadioButton &radio)
     {
@@ -43,49 +40,49 @@ protected:
     }
     static QString Explanation(QWidget &dialog)
     {
-        return FindControlAs<QLabel>(&dialog, resources::IDC_TRIGGER_EXPLANATION)->text();
+        return GetControl<QLabel>(&dialog, resources::IDC_TRIGGER_EXPLANATION).text();
     }
 };
 
 TEST_F(Triggers, TheExplanationFollowsTheButtonsAndOnlyOkTakesTheChoice)
 {
     {
-        CIndexMonitoringDlg dialog(1, &RecordHelp, 0, nullptr);
+        uitest::HelpRecorder help;
+        CIndexMonitoringDlg dialog(1);
+        dialog.SetHelpTarget(help.Target(0));
         ASSERT_EQ(dialog.CreateModeless(nullptr), 1);
-        EXPECT_EQ(dialog.windowTitle(), QStringLiteral("Automatic Indexing Triggered By"));
+        EXPECT_EQ(dialog.windowTitle(), LoadString(Str::TriggersTitle));
         EXPECT_TRUE(Radio(dialog, resources::IDC_TRIGGER_FILE_CHANGES).isChecked());
         EXPECT_EQ(Explanation(dialog), kImmediate);
         Click(Radio(dialog, resources::IDC_TRIGGER_NONE));
         EXPECT_EQ(Explanation(dialog), kScheduled);
-        FindControlAs<QPushButton>(&dialog, resources::IDHELP)->click();
-        FindControlAs<QPushButton>(&dialog, resources::IDCANCEL)->click();
+        GetControl<QPushButton>(&dialog, resources::IDHELP).click();
+        GetControl<QPushButton>(&dialog, resources::IDCANCEL).click();
         EXPECT_EQ(dialog.result(), sharedsource::kResultCancel);
         EXPECT_EQ(dialog.Trigger(), 1) << "Cancel takes nothing";
-        EXPECT_EQ(g_topic, u"ROAM_SEARCH_CRAWLER_CONTROL_DIALOG");
+        EXPECT_EQ(help.calls, std::vector<std::string>{"ROAM_SEARCH_CRAWLER_CONTROL_DIALOG@0"});
     }
-    CIndexMonitoringDlg dialog(0, nullptr, 0, nullptr);
+    CIndexMonitoringDlg dialog(0);
     ASSERT_EQ(dialog.CreateModeless(nullptr), 1);
     EXPECT_EQ(Explanation(dialog), kScheduled);
     QTest::keyClick(&dialog, Qt::Key_F1); // no callback: handled, nothing happens
     Click(Radio(dialog, resources::IDC_TRIGGER_FILE_CHANGES));
-    FindControlAs<QPushButton>(&dialog, resources::IDOK)->click();
+    GetControl<QPushButton>(&dialog, resources::IDOK).click();
     EXPECT_EQ(dialog.result(), sharedsource::kResultOk);
     EXPECT_TRUE(dialog.IsChangeTriggered());
 }
 
 TEST_F(Triggers, ButtonsAndTextStretchWithTheWindow)
 {
-    CIndexMonitoringDlg dialog(0, nullptr, 0, nullptr);
+    CIndexMonitoringDlg dialog(0);
     ASSERT_EQ(dialog.CreateModeless(nullptr), 1);
-    const auto rect = [&dialog](int id) { return FindControl(&dialog, id)->geometry(); };
-    const QRect none = rect(resources::IDC_TRIGGER_NONE), text = rect(resources::IDC_TRIGGER_EXPLANATION),
-                icon = rect(resources::IDC_TRIGGER_ICON), ok = rect(resources::IDOK);
-    dialog.resize(dialog.size() + QSize(100, 50));
-    EXPECT_EQ(rect(resources::IDC_TRIGGER_NONE), none.adjusted(0, 0, 100, 0));
-    EXPECT_EQ(rect(resources::IDC_TRIGGER_EXPLANATION), text.adjusted(0, 0, 100, 0));
-    EXPECT_EQ(rect(resources::IDC_TRIGGER_ICON), icon);
-    EXPECT_EQ(rect(resources::IDOK), ok.translated(0, 50));
-    EXPECT_FALSE(FindControlAs<QLabel>(&dialog, resources::IDC_TRIGGER_ICON)->pixmap().isNull());
+    using namespace resources;
+    uitest::ExpectLayout(dialog, QSize(100, 50),
+                         {{IDC_TRIGGER_NONE, 0, 0, 100, 0},
+                          {IDC_TRIGGER_EXPLANATION, 0, 0, 100, 0},
+                          {IDC_TRIGGER_ICON},
+                          {IDOK, 0, 50, 0, 50}});
+    EXPECT_FALSE(GetControl<QLabel>(&dialog, resources::IDC_TRIGGER_ICON).pixmap().isNull());
     dialog.close();
 }
 

@@ -30,7 +30,13 @@ DialogTemplate TestTemplate()
         {kEdit, ControlKind::Edit, {}, QRect(10, 10, 150, 12)},
         {kBrowse, ControlKind::Button, QStringLiteral("..."), QRect(165, 10, 20, 12)},
         {kHalf, ControlKind::Button, QStringLiteral("half"), QRect(10, 30, 40, 12)},
-        {kCombo, ControlKind::ComboBox, {}, QRect(60, 30, 100, 60), 0, {}, {QStringLiteral("one"), QStringLiteral("two")}},
+        {kCombo,
+         ControlKind::ComboBox,
+         {},
+         QRect(60, 30, 100, 60),
+         0,
+         {},
+         {QStringLiteral("one"), QStringLiteral("two")}},
         {IDOK, ControlKind::DefaultButton, QStringLiteral("OK"), QRect(90, 80, 50, 14)},
         {ID_APPLY_NOW, ControlKind::Button, QStringLiteral("Apply"), QRect(145, 80, 50, 14)},
     };
@@ -42,25 +48,17 @@ const CNSFlexHorizontalConstraint kHalfWay(0.5f, 0.5f);
 class TestDialog final : public ToBaseDlg<CNSFlexDialog>
 {
 public:
-    explicit TestDialog(const LOGFONTW *font = nullptr, std::uint16_t id = kTestTemplate)
-        : ToBaseDlg(id, nullptr)
+    explicit TestDialog(const LOGFONTW *font = nullptr, TemplateRef dialogTemplate = {kTestTemplate, &TestTemplate})
+        : ToBaseDlg(dialogTemplate, nullptr)
     {
-        if (font) {
-            m_font = *font;
-            m_hasFont = true;
-        }
+        if (font)
+            SetHostFont(*font);
         AddConstraint(kEdit, NSFlexExpandRight, NSFlexVerticallyFixed);
         AddConstraint(kBrowse, NSFlexMoveRight, NSFlexVerticallyFixed, true);
         AddConstraint(kHalf, kHalfWay, NSFlexVerticallyFixed);
         AddConstraint(kCombo, NSFlexHorizontallyFixed, NSFlexExpandDown);
         AddConstraint(IDOK, NSFlexHorizontallyFixed, NSFlexMoveDown);
     }
-    bool GetDialogFont(LOGFONTW &font) const override
-    {
-        font = m_font;
-        return m_hasFont;
-    }
-
     bool applyAnswer = true;
     int applied = 0;
 
@@ -71,20 +69,12 @@ protected:
         ++applied;
         return applyAnswer;
     }
-
-private:
-    LOGFONTW m_font{};
-    bool m_hasFont = false;
 };
 
 class FlexDialog : public ::testing::Test
 {
 protected:
-    static void SetUpTestSuite()
-    {
-        uitest::Application();
-        RegisterDialogTemplate(kTestTemplate, &TestTemplate);
-    }
+    static void SetUpTestSuite() { uitest::Application(); }
     void TearDown() override { uitest::ExpectNoWindowsLeft(); }
 
     static QRect Rect(const QWidget &dialog, int id) { return FindControl(&dialog, id)->geometry(); }
@@ -126,7 +116,7 @@ TEST_F(FlexDialog, FractionalProductsAreTruncatedAndCombosKeepTheirListHeight)
 
     TestDialog dialog;
     ASSERT_EQ(dialog.CreateModeless(nullptr), 1);
-    auto *combo = FindControlAs<QComboBox>(&dialog, kCombo);
+    auto *combo = &GetControl<QComboBox>(&dialog, kCombo);
     EXPECT_EQ(combo->count(), 2) << "the template's list";
     const int dropped = DroppedHeight(*combo);
     const int shown = combo->height();
@@ -144,7 +134,7 @@ TEST_F(FlexDialog, ConfirmGoesThroughApplyAndApplyKeepsTheDialogOpen)
     TestDialog dialog;
     dialog.SetApplyContext(77);
     ASSERT_EQ(dialog.CreateModeless(nullptr), 1);
-    auto *apply = FindControlAs<QPushButton>(&dialog, ID_APPLY_NOW);
+    auto *apply = &GetControl<QPushButton>(&dialog, ID_APPLY_NOW);
     EXPECT_FALSE(apply->isEnabled()) << "nothing changed yet";
     dialog.SetModified(true);
     EXPECT_TRUE(apply->isEnabled());
@@ -152,13 +142,13 @@ TEST_F(FlexDialog, ConfirmGoesThroughApplyAndApplyKeepsTheDialogOpen)
     dialog.applyAnswer = false;
     apply->click();
     EXPECT_TRUE(dialog.IsModified() && apply->isEnabled()) << "a refused apply changes nothing";
-    FindControlAs<QPushButton>(&dialog, IDOK)->click();
+    GetControl<QPushButton>(&dialog, IDOK).click();
     EXPECT_TRUE(dialog.isVisible()) << "a refused apply keeps the dialog open";
 
     dialog.applyAnswer = true;
     apply->click();
     EXPECT_FALSE(dialog.IsModified() || apply->isEnabled());
-    FindControlAs<QPushButton>(&dialog, IDOK)->click();
+    GetControl<QPushButton>(&dialog, IDOK).click();
     EXPECT_FALSE(dialog.isVisible());
     EXPECT_EQ(dialog.result(), kResultOk);
     EXPECT_EQ(dialog.applied, 4);
@@ -192,10 +182,10 @@ TEST_F(FlexDialog, HostFontReplacesTheTemplateFont)
 
 TEST_F(FlexDialog, MissingTemplatesAreReported)
 {
-    TestDialog unknown(nullptr, 60999);
+    TestDialog unknown(nullptr, {60999, nullptr});
     EXPECT_EQ(unknown.DoModal(), kModalNotCreated);
     EXPECT_EQ(unknown.CreateModeless(nullptr), kTemplateNotLoaded);
-    TestDialog nameless(nullptr, 0);
+    TestDialog nameless(nullptr, {0, &TestTemplate});
     EXPECT_EQ(nameless.CreateModeless(nullptr), kNoTemplateName);
 }
 

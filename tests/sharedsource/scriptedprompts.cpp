@@ -38,12 +38,24 @@ const char *Name(sharedsource::MessageButtons buttons)
 
 } // namespace
 
+std::string BoxLine(const QString &caption, const QString &text, const char *icon, const char *buttons)
+{
+    return caption.toStdString() + " | " + text.toStdString() + " | " + icon + " | " + buttons;
+}
+
 std::vector<std::string> ScriptedPrompts::Lines() const
 {
     std::vector<std::string> lines;
     for (const sharedsource::Message &m : shown)
-        lines.push_back(m.caption.toStdString() + " | " + m.text.toStdString() + " | " + Name(m.icon) + " | " +
-                        Name(m.buttons));
+        lines.push_back(BoxLine(m.caption, m.text, Name(m.icon), Name(m.buttons)));
+    return lines;
+}
+
+std::vector<std::string> ScriptedPrompts::BrowseLines() const
+{
+    std::vector<std::string> lines;
+    for (const sharedsource::FolderRequest &r : browsed)
+        lines.push_back(r.title.toStdString() + " | " + r.root.toStdString() + " | " + r.select.toStdString());
     return lines;
 }
 

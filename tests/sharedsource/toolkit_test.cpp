@@ -31,8 +31,12 @@ void RecordHelp(BSTR topic, std::uintptr_t context)
 
 class HelpDialog final : public CNSFlexDialog
 {
-protected:
-    void OnHelp() override { ShowHelp({&RecordHelp, 42}, u"TOPIC_KEY"); }
+public:
+    HelpDialog()
+    {
+        SetHelpTarget({&RecordHelp, 42});
+        SetHelpTopic(u"TOPIC_KEY");
+    }
 };
 
 TEST(Help, TopicGoesAsANewCountedStringAndF1IsHandled)

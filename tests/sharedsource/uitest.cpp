@@ -1,5 +1,7 @@
 #include "uitest.h"
 
+#include "sharedsource/dialogtemplate.h"
+
 #include <QDialog>
 
 #include <gtest/gtest.h>
@@ -40,6 +42,42 @@ void ExpectNoWindowsLeft()
         window->close();
     }
     QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
+}
+
+namespace {
+HelpRecorder *g_recorder = nullptr;
+} // namespace
+
+HelpRecorder::HelpRecorder()
+{
+    g_recorder = this;
+}
+
+HelpRecorder::~HelpRecorder()
+{
+    g_recorder = nullptr;
+}
+
+void HelpRecorder::Record(BSTR topic, std::uintptr_t context)
+{
+    EXPECT_EQ(SysStringByteLen(topic), SysStringLen(topic) * 2) << "a counted string";
+    ASSERT_NE(g_recorder, nullptr) << "help called after its recorder ended";
+    g_recorder->calls.push_back(QString::fromUtf16(topic, SysStringLen(topic)).toStdString() + "@" +
+                                std::to_string(context));
+}
+
+void ExpectLayout(QWidget &dialog, QSize growth, std::initializer_list<EdgeMoves> rows)
+{
+    std::vector<QRect> before;
+    for (const EdgeMoves &row : rows)
+        before.push_back(sharedsource::GetControl<QWidget>(&dialog, row.id).geometry());
+    dialog.resize(dialog.size() + growth);
+    std::size_t i = 0;
+    for (const EdgeMoves &row : rows) {
+        const QRect expected = before[i++].adjusted(row.left, row.top, row.right, row.bottom);
+        const QRect actual = sharedsource::GetControl<QWidget>(&dialog, row.id).geometry();
+        EXPECT_EQ(actual, expected) << "control " << row.id << " grown by " << growth.width() << "x" << growth.height();
+    }
 }
 
 ModalPoller::ModalPoller(std::chrono::milliseconds watchdog) : m_watchdog(watchdog)

@@ -4,6 +4,8 @@
 // a poller that acts on modal windows as they appear, and the check that
 // a test leaves no window behind.
 
+#include "sharedsource/help.h"
+
 #include <QApplication>
 #include <QPointer>
 #include <QTimer>
@@ -12,7 +14,9 @@
 #include <chrono>
 #include <deque>
 #include <functional>
+#include <initializer_list>
 #include <string>
+#include <vector>
 
 namespace uitest {
 
@@ -59,6 +63,32 @@ private:
     QPointer<QWidget> m_lastActed;
     int m_acted = 0;
 };
+
+// Records what reaches the host's help while it exists: "TOPIC@context"
+// per call, after checking that the topic came as a counted string.
+class HelpRecorder final
+{
+public:
+    HelpRecorder();
+    HelpRecorder(const HelpRecorder &) = delete;
+    HelpRecorder &operator=(const HelpRecorder &) = delete;
+    ~HelpRecorder();
+
+    sharedsource::HelpTarget Target(std::uintptr_t context = 7) const { return {&Record, context}; }
+    std::vector<std::string> calls;
+
+private:
+    static void Record(BSTR topic, std::uintptr_t context);
+};
+
+// One row of a layout check: how far each edge of a control moved.
+struct EdgeMoves
+{
+    int id;
+    int left = 0, top = 0, right = 0, bottom = 0;
+};
+// Grows dialog by growth and checks every row against the control's rectangle before.
+void ExpectLayout(QWidget &dialog, QSize growth, std::initializer_list<EdgeMoves> rows);
 
 // Matchers and actions used by most tests.
 template <typename Widget>

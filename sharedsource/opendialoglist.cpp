@@ -1,8 +1,8 @@
-#include "entry/opendialoglist.h"
+#include "sharedsource/opendialoglist.h"
 
 #include <algorithm>
 
-namespace cv::vek::rovo {
+namespace sharedsource {
 
 void OpenDialogList::Register(INonModalDialog *dialog, Position *position)
 {
@@ -52,4 +52,14 @@ OpenDialogList &OpenDialogs()
     return list;
 }
 
-} // namespace cv::vek::rovo
+OpenDialogEntry::OpenDialogEntry(INonModalDialog &dialog, OpenDialogList &list) : m_list(list)
+{
+    m_list.Register(&dialog, &m_position);
+}
+
+OpenDialogEntry::~OpenDialogEntry()
+{
+    m_list.Unregister(m_position);
+}
+
+} // namespace sharedsource

@@ -2,13 +2,14 @@
 
 // The module's list of open modeless windows, which the last Cleanup closes.
 // It does not own the windows. Changed on the user-interface thread only.
+// Windows register through an OpenDialogEntry for as long as they exist.
 
 #include "sorvik/serverdialogs.h"
 
 #include <cstddef>
 #include <list>
 
-namespace cv::vek::rovo {
+namespace sharedsource {
 
 class OpenDialogList final
 {
@@ -36,4 +37,18 @@ private:
 
 OpenDialogList &OpenDialogs();
 
-} // namespace cv::vek::rovo
+// A window's place in the open-dialog list from its construction to its destruction.
+class OpenDialogEntry final
+{
+public:
+    explicit OpenDialogEntry(INonModalDialog &dialog, OpenDialogList &list = OpenDialogs());
+    OpenDialogEntry(const OpenDialogEntry &) = delete;
+    OpenDialogEntry &operator=(const OpenDialogEntry &) = delete;
+    ~OpenDialogEntry();
+
+private:
+    OpenDialogList &m_list;
+    OpenDialogList::Position m_position;
+};
+
+} // namespace sharedsource
