@@ -385,15 +385,19 @@ QByteArray SerializeConfiguration(const Configuration &configuration)
 
 void WriteConfigurationFile(const QString &file, const Configuration &configuration)
 {
+    const QByteArray bytes = SerializeConfiguration(configuration);
+    // Unbuffered, so that a write cut short (a full disk) shows in its count:
+    // through the buffer it went unnoticed and half a file replaced the old.
     QSaveFile output(file);
-    if (!output.open(QIODevice::WriteOnly))
+    const bool written = output.open(QIODevice::WriteOnly | QIODevice::Unbuffered)
+        && output.write(bytes) == bytes.size();
+    const QString error = output.errorString();
+    if (!written)
+        output.cancelWriting();
+    if (!written || !output.commit())
         ref::Fail(status::FileWriteFailed,
-                  QStringLiteral("%1 cannot be written: %2").arg(file, output.errorString()).toStdU16String());
-    QXmlStreamWriter xml(&output);
-    WriteConfiguration(xml, configuration);
-    if (xml.hasError() || !output.commit())
-        ref::Fail(status::FileWriteFailed,
-                  QStringLiteral("%1 cannot be written: %2").arg(file, output.errorString()).toStdU16String());
+                  QStringLiteral("%1 cannot be written: %2").arg(file, written ? output.errorString() : error)
+                      .toStdU16String());
 }
 
 } // namespace sorvik::rovo
