@@ -1,5 +1,7 @@
 #include "entry/dialoggallery.h"
 
+#include "configdialog/rovoconfigdlg.h"
+#include "optimize/optimizecustompropswaitdlg.h"
 #include "pages/addsearchareadlg.h"
 #include "pages/indexmonitoringdlg.h"
 #include "resources/strings.h"
@@ -71,11 +73,58 @@ public:
         Save(*box, file);
     }
 
+    // The properties dialog of the local Sorvik, as its store holds it now:
+    // one picture per page, or the error panel when it cannot be read.
+    void Properties()
+    {
+        configdialog::CROVOConfigDlg dialog(krn::WString(), 1);
+        Properties(dialog);
+    }
+
+    void PropertiesError()
+    {
+        configdialog::CROVOConfigDlg dialog(krn::WString(), 1, nullptr, configdialog::ModulePropertyPages(),
+                                            [](const krn::WString &) { return krn::RefPtr<cv::rovo::ISorvik>(); });
+        Properties(dialog);
+    }
+
+    void WaitWindow()
+    {
+        // Without an index manager its worker ends at once and leaves the window to us.
+        auto *window = new optimize::COptimizeCustomPropsWaitDlg({}, LoadString(Str::ConfiguringSorvik));
+        window->SetHostSettings(m_host);
+        if (window->CreateModeless(nullptr) != 1) {
+            delete window;
+            return;
+        }
+        window->OnShowRequest();
+        Save(*window, QStringLiteral("wait-window.png"));
+    }
+
     QStringList Written() const { return m_written; }
 
 private:
+    void Properties(configdialog::CROVOConfigDlg &dialog)
+    {
+        dialog.SetHostSettings(m_host);
+        if (dialog.CreateModeless(nullptr) != 1)
+            return;
+        if (dialog.IsErrorMode()) {
+            Save(dialog, QStringLiteral("properties-error.png"));
+            return;
+        }
+        static const char *const kNames[] = {"search-areas", "parselets", "file-extensions", "indexer", "advanced"};
+        for (configdialog::PageSlot slot : configdialog::kPageSlots) {
+            if (QWidget *page = dialog.Page(slot)) {
+                dialog.Tabs().setCurrentWidget(page);
+                Save(dialog, QStringLiteral("properties-%1.png").arg(QLatin1String(kNames[int(slot)])), false);
+            }
+        }
+        dialog.close();
+    }
+
     // The window's client area under a plain title bar, so the caption shows too.
-    void Save(QWidget &window, const QString &file)
+    void Save(QWidget &window, const QString &file, bool close = true)
     {
         const QPixmap body = window.grab();
         QFont titleFont = window.font();
@@ -92,7 +141,8 @@ private:
         painter.end();
         if (image.save(QDir(m_folder).filePath(file)))
             m_written << file;
-        window.close();
+        if (close)
+            window.close();
     }
 
     QString m_folder;
@@ -112,6 +162,9 @@ QStringList RenderDialogGallery(const QString &folder, const LOGFONTW *font)
     gallery.SearchArea(QStringLiteral("edit-search-area.png"), true);
     gallery.Triggers(QStringLiteral("triggers-none.png"), 0);
     gallery.Triggers(QStringLiteral("triggers-data-file-changes.png"), 1);
+    gallery.Properties();
+    gallery.PropertiesError();
+    gallery.WaitWindow();
 
     const QString path = QStringLiteral("/srv/data/Projects");
     const QString incorrect = LoadString(Str::IncorrectParameter);

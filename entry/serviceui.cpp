@@ -1,5 +1,6 @@
 #include "entry/serviceui.h"
 
+#include "configdialog/rovoconfigdlg.h"
 #include "entry/serverdialogsapp.h"
 #include "pages/addsearchareadlg.h"
 #include "resources/strings.h"
@@ -20,11 +21,16 @@ using sharedsource::MessageResult;
 class CModuleServiceUi final : public IServiceUi
 {
 public:
-    // The properties, optimize and reset dialogs do not exist yet.
-    std::int32_t RunConfigurationDialog(const krn::WString &, const HostSettings &) override
+    std::int32_t RunConfigurationDialog(const krn::WString &connection, const HostSettings &host) override
     {
-        return kDialogNotCreated;
+        if (!TheApp().EnsureApplication())
+            return kDialogNotCreated;
+        configdialog::CROVOConfigDlg dialog(connection, host.waitFlag);
+        dialog.SetHostSettings(host.window);
+        return dialog.DoModal();
     }
+
+    // The optimize and reset dialogs do not exist yet.
     std::int32_t RunOptimizeDialog(const krn::WString &, const HostSettings &) override { return kDialogNotCreated; }
     std::int32_t RunResetDialog(cv::rovo::ISorvik &, const HostSettings &) override { return kDialogNotCreated; }
 
@@ -57,8 +63,8 @@ public:
     {
         if (QApplication *app = TheApp().EnsureApplication())
             sharedsource::QtPrompts().ShowMessage(
-                app->activeWindow(), {LoadString(Str::UnknownError), LoadString(Str::ServerError), MessageIcon::Error,
-                                      MessageButtons::Ok});
+                app->activeWindow(),
+                {LoadString(Str::UnknownError), LoadString(Str::ServerError), MessageIcon::Error, MessageButtons::Ok});
     }
 
     void BeginWaitCursor() override { sharedsource::BeginWaitCursor(); }

@@ -12,7 +12,9 @@
 #include <QDir>
 #include <QFileInfo>
 #include <QFont>
+#include <QEventLoop>
 #include <QScreen>
+#include <QTimer>
 
 #include <cmath>
 #include <cstdio>
@@ -63,6 +65,21 @@ int RenderScreenshots(ModuleHost &module, const QString &folder, const LOGFONTW 
     }
     std::printf("screenshots: %d files in %s\n", int(written), qUtf8Printable(QDir(folder).absolutePath()));
     return kExitDone;
+}
+
+// A host lets the module's modeless windows (the wait window after a
+// commit) finish before it ends the module.
+void WaitForModelessWindows(ModuleHost &module)
+{
+    QEventLoop loop;
+    QTimer poll;
+    QObject::connect(&poll, &QTimer::timeout, &loop, [&] {
+        if (!module.InUse())
+            loop.quit();
+    });
+    poll.start(50);
+    if (module.InUse())
+        loop.exec();
 }
 
 int RunSubcommand(ModuleHost &module, const Options &options, const LOGFONTW &font)
@@ -141,7 +158,9 @@ int main(int argc, char **argv)
         const LOGFONTW font = ApplicationFont();
         if (!options->screenshots.isEmpty())
             return RenderScreenshots(module, options->screenshots, font);
-        return RunSubcommand(module, *options, font);
+        const int exitCode = RunSubcommand(module, *options, font);
+        WaitForModelessWindows(module);
+        return exitCode;
     } catch (const std::exception &e) {
         std::fprintf(stderr, "sorvik-config: %s\n", e.what());
         return kExitFailed;

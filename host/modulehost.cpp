@@ -13,6 +13,7 @@ ModuleHost::ModuleHost(const QString &file)
     m_cleanup = reinterpret_cast<PFN_ServerDialogsCleanup>(Symbol("Cleanup"));
     m_create = reinterpret_cast<PFN_sorvikCreateServerDialogs>(Symbol("sorvikCreateServerDialogs"));
     m_render = reinterpret_cast<PFN_sorvikRenderDialogs>(Symbol("sorvikRenderDialogs"));
+    m_canUnloadNow = reinterpret_cast<PFN_DllCanUnloadNow>(Symbol("DllCanUnloadNow"));
 }
 
 ModuleHost::~ModuleHost()

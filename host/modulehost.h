@@ -26,6 +26,8 @@ public:
     // A service object with one reference, or null with *status set.
     IServerDialogs *CreateService(const QString &connection, std::int32_t *status);
     std::int32_t RenderDialogs(const QString &folder, const LOGFONTW *font);
+    // True while a service object or a modeless window of the module exists.
+    bool InUse() { return m_canUnloadNow() != S_OK; }
 
 private:
     void *Symbol(const char *name);
@@ -35,6 +37,7 @@ private:
     PFN_ServerDialogsCleanup m_cleanup = nullptr;
     PFN_sorvikCreateServerDialogs m_create = nullptr;
     PFN_sorvikRenderDialogs m_render = nullptr;
+    PFN_DllCanUnloadNow m_canUnloadNow = nullptr;
 };
 
 // Init on construction, Cleanup on destruction.

@@ -47,6 +47,7 @@ int RunAddArea(SubcommandContext &context);
 int RunEditArea(SubcommandContext &context);
 int RunExclude(SubcommandContext &context);
 int RunRemove(SubcommandContext &context);
+int RunProperties(SubcommandContext &context);
 int RunStats(SubcommandContext &context);
 // stats needs neither the module nor a service object.
 int RunStats(const QStringList &arguments);

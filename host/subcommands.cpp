@@ -12,6 +12,7 @@ constexpr Subcommand kSubcommands[] = {
     {"edit-area", "PATH", 1, 1, &RunEditArea},
     {"exclude", "PATH", 1, 1, &RunExclude},
     {"remove", "PATH", 1, 1, &RunRemove},
+    {"properties", "", 0, 0, &RunProperties},
     {"stats", "[--portname NAME] [--identification TEXT --secretkey KEY] [--wait]", 0, 7, &RunStats},
 };
 

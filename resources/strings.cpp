@@ -77,6 +77,50 @@ constexpr Entry kTable[] = {
                        "If you remove a search area, you can no longer search for data in this folder. Updating "
                        "the index may take some time and you will not be able to use the Sorvik during that "
                        "time. Do you really want to remove the search area: %1s?")},
+
+    {Str::PropertiesTitle, QT_TRANSLATE_NOOP("ServerDialogs", "Sorvik Properties")},
+    {Str::ConfigureTitle, QT_TRANSLATE_NOOP("ServerDialogs", "Configure %1s")},
+    {Str::MySorvik, QT_TRANSLATE_NOOP("ServerDialogs", "My Sorvik")},
+    {Str::ImportButton, QT_TRANSLATE_NOOP("ServerDialogs", "&Import...")},
+    {Str::ExportButton, QT_TRANSLATE_NOOP("ServerDialogs", "&Export...")},
+    {Str::ConfigurationReadError,
+     QT_TRANSLATE_NOOP("ServerDialogs", "Error while reading the Sorvik configuration. Try to restart the Sorvik.")},
+    {Str::SearchAreasTab, QT_TRANSLATE_NOOP("ServerDialogs", "Search Areas")},
+    {Str::ParseletsTab, QT_TRANSLATE_NOOP("ServerDialogs", "Parselets")},
+    {Str::FileExtensionsTab, QT_TRANSLATE_NOOP("ServerDialogs", "File Extensions")},
+    {Str::IndexerTab, QT_TRANSLATE_NOOP("ServerDialogs", "Indexer")},
+    {Str::AdvancedTab, QT_TRANSLATE_NOOP("ServerDialogs", "Advanced")},
+    {Str::ConfigurationWriteError,
+     QT_TRANSLATE_NOOP("ServerDialogs", "An error has occurred while writing the Sorvik configuration.")},
+    {Str::ConfiguringSorvik, QT_TRANSLATE_NOOP("ServerDialogs", "Configuring Sorvik...")},
+
+    {Str::ImportQuestion,
+     QT_TRANSLATE_NOOP("ServerDialogs", "Importing a Sorvik configuration may take some time and you will not be able "
+                                        "to use the Sorvik during that time. Do you want to continue?")},
+    {Str::ConfigurationFileFilter, QT_TRANSLATE_NOOP("ServerDialogs", "Sorvik Configuration (*.skc)|*.skc||")},
+    {Str::ImportError,
+     QT_TRANSLATE_NOOP("ServerDialogs", "An error has occurred while importing the Sorvik configuration.")},
+    {Str::ExportError,
+     QT_TRANSLATE_NOOP("ServerDialogs", "An error has occurred while exporting the Sorvik configuration.")},
+
+    {Str::AddSearchAreaTool, QT_TRANSLATE_NOOP("ServerDialogs", "Add Search Area")},
+    {Str::ExcludeSubfolderTool, QT_TRANSLATE_NOOP("ServerDialogs", "Exclude Subfolder")},
+    {Str::RemoveTool, QT_TRANSLATE_NOOP("ServerDialogs", "Remove")},
+    {Str::UpTool, QT_TRANSLATE_NOOP("ServerDialogs", "Up")},
+    {Str::DownTool, QT_TRANSLATE_NOOP("ServerDialogs", "Down")},
+    {Str::AddSearchAreaMenu, QT_TRANSLATE_NOOP("ServerDialogs", "Add Search Area...")},
+    {Str::ExcludeSubfolderMenu, QT_TRANSLATE_NOOP("ServerDialogs", "Exclude Subfolder...")},
+    {Str::RemoveMenu, QT_TRANSLATE_NOOP("ServerDialogs", "Remove")},
+    {Str::UpMenu, QT_TRANSLATE_NOOP("ServerDialogs", "Up")},
+    {Str::DownMenu, QT_TRANSLATE_NOOP("ServerDialogs", "Down")},
+    {Str::RenameMenu, QT_TRANSLATE_NOOP("ServerDialogs", "Rename")},
+    {Str::ExploreMenu, QT_TRANSLATE_NOOP("ServerDialogs", "Explore...")},
+    {Str::SelectFolderToExclude, QT_TRANSLATE_NOOP("ServerDialogs", "Select folder to exclude:")},
+    {Str::CannotExcludeSearchArea,
+     QT_TRANSLATE_NOOP("ServerDialogs", "It is not possible to exclude an entire search area.")},
+    {Str::FolderAlreadyExcluded,
+     QT_TRANSLATE_NOOP("ServerDialogs", "The folder with the path %1s has already been excluded from the search areas.")},
+    {Str::ExploreError, QT_TRANSLATE_NOOP("ServerDialogs", "Opening the folder in Explorer has caused an error.")},
 };
 
 static_assert(std::size(kTable) == std::size_t(Str::Count), "every Str has exactly one row");

@@ -50,6 +50,42 @@ enum class Str
     ExcludeFolderQuestion,
     RemoveSearchAreaQuestion,
 
+    PropertiesTitle,
+    ConfigureTitle,
+    MySorvik,
+    ImportButton,
+    ExportButton,
+    ConfigurationReadError,
+    SearchAreasTab,
+    ParseletsTab,
+    FileExtensionsTab,
+    IndexerTab,
+    AdvancedTab,
+    ConfigurationWriteError,
+    ConfiguringSorvik,
+
+    ImportQuestion,
+    ConfigurationFileFilter,
+    ImportError,
+    ExportError,
+
+    AddSearchAreaTool,
+    ExcludeSubfolderTool,
+    RemoveTool,
+    UpTool,
+    DownTool,
+    AddSearchAreaMenu,
+    ExcludeSubfolderMenu,
+    RemoveMenu,
+    UpMenu,
+    DownMenu,
+    RenameMenu,
+    ExploreMenu,
+    SelectFolderToExclude,
+    CannotExcludeSearchArea,
+    FolderAlreadyExcluded,
+    ExploreError,
+
     Count
 };
 

@@ -17,8 +17,7 @@ constexpr char16_t kTemplateFace[] = u"MS Shell Dlg";
 void AddStandardButtons(DialogTemplate &dialog, int top, int left)
 {
     dialog.controls.push_back({IDOK, ControlKind::DefaultButton, LoadString(Str::Ok), QRect(left, top, 50, 14)});
-    dialog.controls.push_back(
-        {IDCANCEL, ControlKind::Button, LoadString(Str::Cancel), QRect(left + 54, top, 50, 14)});
+    dialog.controls.push_back({IDCANCEL, ControlKind::Button, LoadString(Str::Cancel), QRect(left + 54, top, 50, 14)});
     dialog.controls.push_back({IDHELP, ControlKind::Button, LoadString(Str::Help), QRect(left + 108, top, 50, 14)});
 }
 
@@ -62,6 +61,56 @@ DialogTemplate IndexMonitoringTemplate()
     };
     AddStandardButtons(dialog, 82, 64);
     return dialog;
+}
+
+DialogTemplate SorvikPropertiesTemplate()
+{
+    DialogTemplate dialog;
+    dialog.id = IDD_SORVIK_PROPERTIES;
+    dialog.title = LoadString(Str::PropertiesTitle);
+    dialog.size = QSize(360, 220);
+    dialog.fontFace = QString::fromUtf16(kTemplateFace);
+    dialog.pointSize = 8;
+    dialog.controls = {
+        {IDC_PROPERTY_TABS, ControlKind::Custom, {}, QRect(7, 25, 346, 167)},
+        {IDC_IMPORT, ControlKind::Button, LoadString(Str::ImportButton), QRect(247, 6, 50, 14)},
+        {IDC_EXPORT, ControlKind::Button, LoadString(Str::ExportButton), QRect(303, 6, 50, 14)},
+    };
+    AddStandardButtons(dialog, 199, 195);
+    dialog.controls.push_back({IDC_CONFIG_ERROR_TEXT, ControlKind::Text, LoadString(Str::ConfigurationReadError),
+                               QRect(36, 12, 317, 20), style::kHidden});
+    dialog.controls.push_back(
+        {IDC_CONFIG_ERROR_ICON, ControlKind::Icon, QStringLiteral("error"), QRect(7, 7, 21, 21), style::kHidden});
+    return dialog;
+}
+
+DialogTemplate SearchAreasTemplate()
+{
+    DialogTemplate page;
+    page.id = IDD_SEARCH_AREAS;
+    page.size = QSize(338, 146);
+    page.fontFace = QString::fromUtf16(kTemplateFace);
+    page.pointSize = 8;
+    page.controls = {
+        {IDC_SEARCH_AREAS_TOOLBAR, ControlKind::Placeholder, {}, QRect(250, 3, 80, 16)},
+        {IDC_SEARCH_AREA_TREE, ControlKind::Custom, {}, QRect(7, 22, 324, 117)},
+    };
+    return page;
+}
+
+DialogTemplate WaitTemplate()
+{
+    DialogTemplate window;
+    window.id = IDD_WAIT;
+    window.size = QSize(160, 44);
+    window.fontFace = QString::fromUtf16(kTemplateFace);
+    window.pointSize = 8;
+    window.visible = false;
+    window.controls = {
+        {IDC_WAIT_PLACEHOLDER, ControlKind::Placeholder, {}, QRect(0, 0, 160, 44)},
+        {IDC_WAIT_ANIMATION, ControlKind::Animation, {}, QRect(0, 0, 160, 44)},
+    };
+    return window;
 }
 
 } // namespace resources

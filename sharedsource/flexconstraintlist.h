@@ -27,6 +27,8 @@ public:
     void SetBaseline(QSize clientSize) { m_baseline = clientSize; }
     QSize Baseline() const { return m_baseline; }
     bool IsCaptured() const { return m_captured; }
+    // The next resize measures the start rectangles again.
+    void Uncapture() { m_captured = false; }
     std::size_t Count() const { return m_entries.size(); }
 
     // Lays the controls out for the new client size, measuring their start

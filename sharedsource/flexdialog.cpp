@@ -27,7 +27,8 @@ void CNSFlexDialog::SetModified(bool modified)
 bool CNSFlexDialog::OnInitDialog()
 {
     m_minimumSize = size();
-    setMinimumSize(m_minimumSize);
+    if (isWindow())
+        setMinimumSize(m_minimumSize);
     m_constraints.SetBaseline(size());
     m_initialised = true;
 
@@ -41,6 +42,16 @@ bool CNSFlexDialog::OnInitDialog()
     wire(ID_APPLY_NOW, [this] { OnApplyNow(); });
     SetModified(false);
     return true;
+}
+
+void CNSFlexDialog::RebaseLayout(QSize size)
+{
+    m_minimumSize = size;
+    if (isWindow())
+        setMinimumSize(size);
+    m_constraints.SetBaseline(size);
+    m_constraints.Uncapture();
+    resize(size);
 }
 
 bool CNSFlexDialog::DataExchange(bool)

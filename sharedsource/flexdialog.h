@@ -47,15 +47,21 @@ public:
 
     // Mirrors the enabled state of the Apply button, if the dialog has one.
     void SetModified(bool modified);
-    bool IsModified() const { return m_modified; }
+    bool HasApplyPending() const { return m_modified; }
 
     void SetApplyContext(std::uintptr_t context) { m_applyContext = context; }
     std::uintptr_t ApplyContext() const { return m_applyContext; }
     QSize MinimumSize() const { return m_minimumSize; }
 
-    // Once the controls exist: records the minimum size and the layout
-    // baseline, wires the standard buttons, disables Apply.
+    // Once the controls exist: records the minimum size (of a window; a page
+    // takes the size its tab control gives) and the layout baseline, wires
+    // the standard buttons, disables Apply.
     virtual bool OnInitDialog();
+
+    // Makes size the new minimum and baseline, and the controls' present
+    // places their start: for a dialog that rearranges itself (an error
+    // panel in place of its pages) before it is resized.
+    void RebaseLayout(QSize size);
 
     void accept() override; // OK: data exchange, apply, then close with OK
     void reject() override; // closes with Cancel

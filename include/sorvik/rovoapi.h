@@ -40,6 +40,9 @@ constexpr std::int32_t FileWriteFailed = -21010;       // a configuration file c
 constexpr std::int32_t CatalogueFailed = -21011;       // the data-store library could not supply the catalogue
 constexpr std::int32_t NotAllowed = -21012;            // the store's policy forbids the change
 constexpr std::int32_t Internal = -21013;              // a failure the library did not foresee
+constexpr std::int32_t ServerNotRunning = -21014;      // the server instance is not running (any more)
+constexpr std::int32_t ServerNotResponding = -21015;   // the server instance did not answer in time
+constexpr std::int32_t Unsupported = -21016;           // the running server does not offer the operation
 } // namespace status
 
 // Result of CheckAreaAllowed.
@@ -264,16 +267,20 @@ struct SORVIK_EXPORT IOptimizationEditor : IRefCounted
     virtual void Commit(std::int32_t *status) = 0;
 };
 
-// Exists only while the server runs.
+// Exists only while the server runs: once the server has gone, every
+// operation fails with ServerNotRunning.
 struct SORVIK_EXPORT IIndexManager : IRefCounted
 {
-    virtual double GetVersion(std::int32_t *status) = 0; // e.g. 2.01
+    // major + minor / 100 + patch / 10000: 2.1.0 is 2.01, 18.0.0 is 18.0.
+    virtual double GetVersion(std::int32_t *status) = 0;
     virtual void ResetTimeoutFiles(std::int32_t *status) = 0;
     virtual void ResetFailedFiles(std::int32_t *status) = 0;
     // kind kBrowseTimeout or kQueryTimeout; takes effect at once.
     virtual void SetServiceTimeout(std::int32_t kind, std::uint32_t milliseconds, std::int32_t *status) = 0;
-    // Returns when the server has applied the committed changes; UpdateTimedOut
-    // (-1008) when its own time-out passed first.
+    // Returns when the server has applied every change committed before the
+    // call; UpdateTimedOut (-1008) when its own time-out passed first,
+    // ServerNotRunning when the server is gone or ends meanwhile. Safe to
+    // call from any thread.
     virtual void WaitForUpdate(std::int32_t *status) = 0;
     virtual ILevelPropertyList *GetLevelProperties(const WString &level, std::int32_t *status) = 0; // or null
     virtual IServerContext *GetServerContext(std::int32_t *status) = 0;

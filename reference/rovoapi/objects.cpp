@@ -3,6 +3,7 @@
 #include "reference/rovoapi/catalogueinfo.h"
 #include "reference/rovoapi/config.h"
 #include "reference/rovoapi/connection.h"
+#include "reference/rovoapi/indexmanager.h"
 #include "reference/rovoapi/skc.h"
 #include "reference/rovoapi/store.h"
 #include "reference/rovoapi/writer.h"
@@ -235,8 +236,10 @@ public:
             m_db->SetBusyTimeout(CommitTimeoutMilliseconds());
             Transaction transaction(*m_db, Transaction::Kind::Write, status::UpdateTimedOut);
             ApplyAll();
+            const std::int64_t generation = AdvanceConfigGeneration(*m_db);
             transaction.Commit();
             m_changes.clear();
+            AnnounceCommit(m_context->storeFile, generation);
         });
     }
 
@@ -653,8 +656,10 @@ public:
         return Guard(status, [&]() -> cv::rovo::IConfigurationEditor * { return new Editor(m_context); });
     }
 
-    // The reference library has no running server to manage.
-    cv::rovo::IIndexManager *GetIndexManager(std::int32_t *) override { return nullptr; }
+    cv::rovo::IIndexManager *GetIndexManager(std::int32_t *status) override
+    {
+        return Guard(status, [&] { return OpenIndexManager(m_context->connection, m_context->storeFile); });
+    }
 
     void ResetSorvik(std::int32_t mode, std::int32_t flags, std::int32_t *status) override
     {
@@ -670,7 +675,9 @@ public:
                 ResetConfiguration(*m_db);
             m_db->Exec("UPDATE meta SET value = CAST(value AS INTEGER) + 1 WHERE name = 'index_generation'");
             AddRequest(*m_db, QStringLiteral("reset-index"), QString::number(mode));
+            const std::int64_t generation = AdvanceConfigGeneration(*m_db);
             transaction.Commit();
+            AnnounceCommit(m_context->storeFile, generation);
         });
     }
 

@@ -6,6 +6,7 @@
 
 #include <QDateTime>
 #include <QDir>
+#include <QFile>
 #include <QFileInfo>
 
 namespace sorvik::rovo {
@@ -85,7 +86,7 @@ void Initialise(Db &db)
     for (const char *sql : kSchema)
         db.Exec(sql);
     WriteSettings(db, DefaultSettings(db.File()));
-    Statement meta(db, "INSERT INTO meta(name, value) VALUES ('index_generation', '0')");
+    Statement meta(db, "INSERT INTO meta(name, value) VALUES ('index_generation', '0'), ('config_generation', '0')");
     meta.Run();
     db.Exec("PRAGMA application_id=1397707350");
     db.Exec("PRAGMA user_version=1");
@@ -178,6 +179,42 @@ void AddRequest(Db &db, const QString &kind, const QString &argument)
 {
     Statement insert(db, "INSERT INTO requests(kind, argument, requested) VALUES (?, ?, ?)");
     insert.Bind(1, kind).Bind(2, argument).Bind(3, QDateTime::currentDateTimeUtc().toString(Qt::ISODateWithMs)).Run();
+}
+
+std::int64_t ConfigGeneration(Db &db)
+{
+    Statement select(db, "SELECT CAST(value AS INTEGER) FROM meta WHERE name = 'config_generation'");
+    return select.Step() ? select.Int(0) : 0;
+}
+
+std::int64_t AdvanceConfigGeneration(Db &db)
+{
+    // Stores made before the generation existed lack the row.
+    db.Exec("INSERT INTO meta(name, value) VALUES ('config_generation', '1') "
+            "ON CONFLICT(name) DO UPDATE SET value = CAST(value AS INTEGER) + 1");
+    return ConfigGeneration(db);
+}
+
+QString CommitMarkerFile(const QString &storeFile)
+{
+    return storeFile + QStringLiteral("-commit");
+}
+
+void AnnounceCommit(const QString &storeFile, std::int64_t generation)
+{
+    QFile marker(CommitMarkerFile(storeFile));
+    if (marker.open(QIODevice::WriteOnly | QIODevice::Truncate))
+        marker.write(QByteArray::number(qlonglong(generation)) + '\n');
+}
+
+std::vector<StoreRequest> ReadRequests(Db &db, std::int64_t afterId)
+{
+    Statement select(db, "SELECT id, kind, argument FROM requests WHERE id > ? ORDER BY id");
+    select.Bind(1, afterId);
+    std::vector<StoreRequest> requests;
+    while (select.Step())
+        requests.push_back({select.Int(0), select.Text(1), select.Text(2)});
+    return requests;
 }
 
 } // namespace sorvik::rovo

@@ -11,7 +11,9 @@
 
 #include <QString>
 
+#include <cstdint>
 #include <memory>
+#include <vector>
 
 namespace sorvik::rovo {
 
@@ -32,5 +34,31 @@ std::unique_ptr<Db> OpenStore(const QString &file, bool verify);
 void ResetConfiguration(Db &db);
 // Appends a request for the server (done after the commit).
 void AddRequest(Db &db, const QString &kind, const QString &argument);
+
+// Every commit (and every reset) advances the configuration generation by
+// one inside its own transaction; a running server records the generation it
+// has applied, and the index manager waits for it. 0 for a store that was
+// never committed to.
+std::int64_t ConfigGeneration(Db &db);
+// Returns the new generation.
+std::int64_t AdvanceConfigGeneration(Db &db);
+
+// Once a commit is through, the committer writes the generation to the
+// commit marker beside the store ("<store file>-commit"): closing it wakes
+// a running server, which watches it. (SQLite's own files change before a
+// commit becomes visible to readers, so they cannot serve as the signal.)
+// A marker that cannot be written is left alone: the server then takes the
+// commit up with the next one, or when a WaitForUpdate asks for it.
+QString CommitMarkerFile(const QString &storeFile);
+void AnnounceCommit(const QString &storeFile, std::int64_t generation);
+
+struct StoreRequest
+{
+    std::int64_t id = 0;
+    QString kind;
+    QString argument;
+};
+// The requests with an id above afterId, oldest first.
+std::vector<StoreRequest> ReadRequests(Db &db, std::int64_t afterId);
 
 } // namespace sorvik::rovo

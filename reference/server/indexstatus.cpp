@@ -1,5 +1,7 @@
 #include "reference/server/indexstatus.h"
 
+#include "sorvik/rovoapi.h"
+
 #include <QDir>
 #include <QFile>
 
@@ -88,9 +90,14 @@ std::uint32_t IndexStatus::ElementCount(std::uint32_t kind)
 
 std::uint32_t IndexStatus::Counter(const char *name)
 {
+    return Clamped(Value(name));
+}
+
+std::int64_t IndexStatus::Value(const char *name)
+{
     rovo::Statement query(m_db, "SELECT value FROM counters WHERE name = ?1");
     query.Bind(1, QString::fromLatin1(name));
-    return query.Step() ? Clamped(query.Int(0)) : 0;
+    return query.Step() ? query.Int(0) : 0;
 }
 
 void IndexStatus::SetCounter(const char *name, std::int64_t value)
@@ -144,6 +151,31 @@ void IndexStatus::ResetNotMyFile()
 {
     std::lock_guard lock(m_lock);
     SetCounter("not_my_file", 0);
+}
+
+void IndexStatus::ResetIndex()
+{
+    std::lock_guard lock(m_lock);
+    rovo::Transaction transaction(m_db, rovo::Transaction::Kind::Write, cv::rovo::status::StoreUnavailable);
+    m_db.Exec("DELETE FROM element_counts;"
+              "DELETE FROM parselet_timeouts;"
+              "UPDATE counters SET value = 0 WHERE name IN ('disk_full_crawl_stop', 'failures', 'not_my_file')");
+    transaction.Commit();
+}
+
+std::int64_t IndexStatus::AppliedRequest()
+{
+    std::lock_guard lock(m_lock);
+    return Value("applied_request");
+}
+
+void IndexStatus::RecordApplied(std::int64_t generation, std::int64_t request)
+{
+    std::lock_guard lock(m_lock);
+    rovo::Transaction transaction(m_db, rovo::Transaction::Kind::Write, cv::rovo::status::StoreUnavailable);
+    SetCounter("applied_generation", generation);
+    SetCounter("applied_request", request);
+    transaction.Commit();
 }
 
 } // namespace sorvik::server

@@ -40,10 +40,18 @@ public:
     void ResetTimeouted();
     void ResetFailure();
     void ResetNotMyFile();
+    // Forgets everything the index knew (a reset of the index).
+    void ResetIndex();
+
+    // What the server has taken up of its configuration, kept beside the
+    // index so that a restarted server knows which requests it has done.
+    std::int64_t AppliedRequest();
+    void RecordApplied(std::int64_t generation, std::int64_t request);
 
 private:
     bool FolderChanged();
     std::uint32_t Counter(const char *name);
+    std::int64_t Value(const char *name);
     void SetCounter(const char *name, std::int64_t value);
 
     std::mutex m_lock;

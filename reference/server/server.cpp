@@ -5,10 +5,14 @@
 #include "reference/comm/listener.h"
 #include "sorvik/rovocomm.h"
 #include "reference/libsupport/refobject.h"
+#include "reference/rovoapi/store.h"
+#include "reference/server/configapplier.h"
 #include "reference/server/indexstatus.h"
 #include "reference/server/logonacceptor.h"
+#include "reference/server/managerchannel.h"
+#include "reference/server/managerrequests.h"
 #include "reference/server/protocolsession.h"
-#include "reference/server/storeconfiguration.h"
+#include "reference/server/servicetimeouts.h"
 
 #include <QString>
 
@@ -56,7 +60,7 @@ bool WaitForInput(int socket, int stopEvent)
     return waits[1].revents == 0;
 }
 
-void Serve(FramedSocket &socket, ServerContext &context, int stopEvent)
+void Serve(FramedSocket &socket, ServerContext &context, const ServiceTimeouts &timeouts, int stopEvent)
 {
     ProtocolSession session(context);
     cv::krn::ByteBuffer record;
@@ -67,7 +71,9 @@ void Serve(FramedSocket &socket, ServerContext &context, int stopEvent)
         if (result != kResultOk)
             return;
         const auto response = session.Handle(record.bytes());
-        if (!response || socket.Send(response->bytes(), cv::vek::rovo::comm::kInfinite) != kResultOk)
+        // A client that does not take its response within the browse and
+        // connection time-out loses the connection.
+        if (!response || socket.Send(response->bytes(), timeouts.BrowseMs()) != kResultOk)
             return;
     }
 }
@@ -81,6 +87,32 @@ void AnnounceLogOn(const std::u16string &clientName)
     std::fflush(stdout);
 }
 
+void Announce(const char *format, long long value)
+{
+    std::printf(format, value);
+    std::fflush(stdout);
+}
+
+// What the server does with a configuration it takes up.
+void TakeUp(ServiceTimeouts &timeouts, IndexStatus &status, const CommittedConfiguration &committed)
+{
+    const rovo::Settings &settings = committed.configuration.settings;
+    timeouts.TakeUp(settings.browseTimeout, settings.queryTimeout);
+    for (const rovo::StoreRequest &request : committed.requests) {
+        if (request.kind == u"reset-index")
+            status.ResetIndex();
+    }
+    const std::int64_t lastRequest =
+        committed.requests.empty() ? status.AppliedRequest() : committed.requests.back().id;
+    status.RecordApplied(committed.generation, lastRequest);
+    Announce("applied configuration %lld\n", committed.generation);
+}
+
+[[noreturn]] void Unusable(const char *what, const ref::Failure &failure)
+{
+    throw std::runtime_error(std::string(what) + ": " + QString::fromStdU16String(failure.text).toStdString());
+}
+
 } // namespace
 
 struct Server::State
@@ -89,6 +121,12 @@ struct Server::State
     std::unique_ptr<cv::krn::osdep::Mutex> globalMutex;
     std::unique_ptr<cv::krn::osdep::Mutex> instanceMutex;
     std::unique_ptr<IndexStatus> status;
+    // Declared in the order they are needed; they go in reverse, so the
+    // threads of the channel and the applier end before what they use.
+    ServiceTimeouts timeouts;
+    std::unique_ptr<ConfigApplier> applier;
+    std::unique_ptr<ManagerRequests> managerRequests;
+    std::unique_ptr<ManagerChannel> manager;
     std::atomic<std::uint32_t> loggedOnUsers{0};
     AcceptorFactory makeKerberosAcceptor;
     cv::vek::rovo::comm::Listener listener;
@@ -118,12 +156,34 @@ Server::Server(ServerOptions options, AcceptorFactory makeKerberosAcceptor) : m_
         state.globalMutex = Hold(cv::vek::rovo::dunemere::kGlobalServerMutexName, "global server mutex");
     state.instanceMutex = Hold(cv::vek::rovo::dunemere::InstanceMutexName(portName), "instance mutex");
 
+    // The Sorvik of this instance: the local one, or the one named like the port.
+    const QString storeFile = rovo::StoreFile(QString::fromStdU16String(portName));
     try {
-        state.status = std::make_unique<IndexStatus>(IndexFolderOf(portName));
+        state.applier = std::make_unique<ConfigApplier>(
+            storeFile, std::chrono::milliseconds(state.options.applyDelayMs));
     } catch (const ref::Failure &failure) {
-        throw std::runtime_error("cannot open the index status: " +
-                                 QString::fromStdU16String(failure.text).toStdString());
+        Unusable("cannot read the configuration", failure);
     }
+    try {
+        state.status = std::make_unique<IndexStatus>(state.applier->CommittedSettings().indexPath);
+    } catch (const ref::Failure &failure) {
+        Unusable("cannot open the index status", failure);
+    }
+    try {
+        state.applier->Start(state.status->AppliedRequest(),
+                             [&state](const CommittedConfiguration &committed) {
+                                 TakeUp(state.timeouts, *state.status, committed);
+                             });
+    } catch (const ref::Failure &failure) {
+        Unusable("cannot take up the configuration", failure);
+    }
+
+    // The manager channel listens before the client service, so a client
+    // that finds the service finds the index manager too.
+    state.managerRequests =
+        std::make_unique<ManagerRequests>(state.options, storeFile, *state.status, *state.applier, state.timeouts);
+    state.manager = std::make_unique<ManagerChannel>(portName, *state.managerRequests);
+    state.manager->Start();
 
     if (portName.empty())
         state.listener.ListenLocal(u"VEK_INDEX_SERVICE", u"VEK_INDEX_SERVICE_SEARCH_BROWSE");
@@ -138,6 +198,7 @@ void Server::Run(const std::atomic<bool> &stop)
     State &state = *m_state;
     ServerContext context{state.options, *state.status, state.loggedOnUsers, state.makeKerberosAcceptor,
                           &AnnounceLogOn};
+    const ServiceTimeouts &timeouts = state.timeouts;
 
     struct Connection
     {
@@ -164,9 +225,9 @@ void Server::Run(const std::atomic<bool> &stop)
             continue;
         Connection &connection = connections.emplace_back();
         connection.socket = std::move(socket);
-        connection.thread = std::thread([&connection, &context, stopEvent = state.stopEvent] {
+        connection.thread = std::thread([&connection, &context, &timeouts, stopEvent = state.stopEvent] {
             try {
-                Serve(*connection.socket, context, stopEvent);
+                Serve(*connection.socket, context, timeouts, stopEvent);
             } catch (const std::exception &) {
                 // Out of memory or a failing store: this client loses its
                 // connection, the others keep theirs.
@@ -179,6 +240,8 @@ void Server::Run(const std::atomic<bool> &stop)
     [[maybe_unused]] const ssize_t written = ::write(state.stopEvent, &one, sizeof one);
     for (Connection &connection : connections)
         connection.thread.join();
+    state.manager->Stop();
+    state.applier->Stop();
 }
 
 } // namespace sorvik::server

@@ -26,6 +26,9 @@ std::optional<std::uint32_t> ParseField(std::string_view text, std::uint32_t lim
     return value;
 }
 
+// A day is far more than any test or demonstration needs.
+constexpr std::uint32_t kMaxApplyDelayMs = 86400000;
+
 } // namespace
 
 std::optional<std::uint32_t> ParsePackedVersion(std::string_view text)
@@ -70,7 +73,7 @@ std::optional<ServerOptions> ParseServerOptions(int argc, char **argv, std::stri
         }
         if (option != "--portname" && option != "--version" && option != "--identification" &&
             option != "--secretkey" && option != "--keytab" && option != "--principal" && option != "--store" &&
-            option != "--client-target") {
+            option != "--client-target" && option != "--apply-delay-ms") {
             error = "unknown option " + std::string(option);
             return std::nullopt;
         }
@@ -96,6 +99,14 @@ std::optional<ServerOptions> ParseServerOptions(int argc, char **argv, std::stri
             options.principal = Utf16(*text);
         } else if (option == "--client-target") {
             options.clientTarget = Utf16(*text);
+        } else if (option == "--apply-delay-ms") {
+            const auto delay = ParseField(*text, kMaxApplyDelayMs);
+            if (!delay) {
+                error = "--apply-delay-ms wants milliseconds from 0 to " + std::to_string(kMaxApplyDelayMs) + ", got " +
+                        std::string(*text);
+                return std::nullopt;
+            }
+            options.applyDelayMs = *delay;
         } else {
             options.store = std::string(*text);
         }

@@ -2,6 +2,7 @@
 
 #include <cstdint>
 #include <optional>
+#include <string_view>
 #include <string>
 
 namespace sorvik::server {
@@ -11,7 +12,7 @@ namespace sorvik::server {
 //          [--identification TEXT --secretkey KEY]
 //          [--keytab FILE --principal NAME] [--require-authentication]
 //          [--client-target NAME] [--skip-mutual-authentication]
-//          [--store DIR]
+//          [--store DIR] [--apply-delay-ms N]
 struct ServerOptions
 {
     // Empty: the default local server, which also holds the global mutex.
@@ -34,6 +35,9 @@ struct ServerOptions
     bool skipMutualAuthentication = false;
     // The folder of the configuration stores.
     std::string store;
+    // How long taking up each committed configuration takes (for showing and
+    // testing slow servers).
+    std::uint32_t applyDelayMs = 0;
 
     bool RequiresAuthentication() const { return requireAuthentication || !keytab.empty(); }
     bool ChecksClientProof() const { return !identification.empty(); }

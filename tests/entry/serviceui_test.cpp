@@ -152,9 +152,24 @@ TEST_F(ModuleUi, ExcludeAndRemoveAskFirst)
     EXPECT_TRUE(Snapshot().empty());
 }
 
+TEST_F(ModuleUi, ThePropertiesDialogRunsModallyAndAnswersItsResult)
+{
+    uitest::ModalPoller poller;
+    const auto press = [](int button) {
+        return [button](QWidget &w) { GetControl<QAbstractButton>(&w, button).click(); };
+    };
+    const auto isProperties = [](QWidget &w) {
+        return w.windowTitle() == FormatString(Str::ConfigureTitle, LoadString(Str::MySorvik));
+    };
+    poller.Expect("the properties dialog", isProperties, press(resources::IDCANCEL));
+    EXPECT_EQ(m_service->ShowConfigurationDialog(), kModalCancel);
+    poller.Expect("the properties dialog again", isProperties, press(resources::IDOK));
+    EXPECT_EQ(m_service->ShowConfigurationDialog(), kModalOk);
+    EXPECT_TRUE(poller.Done());
+}
+
 TEST_F(ModuleUi, DialogsOfLaterIssuesAreNotCreatedYet)
 {
-    EXPECT_EQ(m_service->ShowConfigurationDialog(), kDialogNotCreated);
     EXPECT_EQ(m_service->ShowOptimizeDialog(), kDialogNotCreated);
 }
 

@@ -141,13 +141,13 @@ TEST_F(FlexDialog, ConfirmGoesThroughApplyAndApplyKeepsTheDialogOpen)
 
     dialog.applyAnswer = false;
     apply->click();
-    EXPECT_TRUE(dialog.IsModified() && apply->isEnabled()) << "a refused apply changes nothing";
+    EXPECT_TRUE(dialog.HasApplyPending() && apply->isEnabled()) << "a refused apply changes nothing";
     GetControl<QPushButton>(&dialog, IDOK).click();
     EXPECT_TRUE(dialog.isVisible()) << "a refused apply keeps the dialog open";
 
     dialog.applyAnswer = true;
     apply->click();
-    EXPECT_FALSE(dialog.IsModified() || apply->isEnabled());
+    EXPECT_FALSE(dialog.HasApplyPending() || apply->isEnabled());
     GetControl<QPushButton>(&dialog, IDOK).click();
     EXPECT_FALSE(dialog.isVisible());
     EXPECT_EQ(dialog.result(), kResultOk);
