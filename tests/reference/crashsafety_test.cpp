@@ -2,6 +2,8 @@
 // point of it, or its disk fills: a store that opens and holds the old or the
 // new configuration, an error for whoever asked, and an old file unchanged.
 
+#include "support/scopedenv.h"
+#include "support/sorvikprocess.h"
 #include "support/tempdir.h"
 
 #include <gtest/gtest.h>
@@ -12,10 +14,12 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <chrono>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
 #include <string>
+#include <thread>
 #include <vector>
 
 extern char **environ;
@@ -208,6 +212,48 @@ TEST_F(CommitFaults, AFullDiskDuringAnExportKeepsTheOldFile)
     EXPECT_EQ(FileText(file), before);
     EXPECT_EQ(std::distance(std::filesystem::directory_iterator(m_dir.path()), {}), 4)
         << "no temporary file is left beside it";
+}
+
+// The server reads the store while it takes a commit up and writes only its
+// own status: killing it then leaves the store as the commit left it, and the
+// next server takes the commit up.
+// The generations a server's output says it took up.
+std::vector<long> Applied(const std::string &output)
+{
+    std::vector<long> generations;
+    const std::string mark = "applied configuration ";
+    for (auto at = output.find(mark); at != std::string::npos; at = output.find(mark, at + 1))
+        generations.push_back(std::stol(output.substr(at + mark.size())));
+    return generations;
+}
+
+TEST_F(CommitFaults, AServerKilledWhileTakingUpACommitLeavesTheStoreWhole)
+{
+    const auto store = Fresh("served");
+    testsupport::ScopedEnv storeFolder("CORVANE_SORVIK_STORE", store.string());
+    testsupport::ScopedEnv runtime("CORVANE_RUNTIME_DIR", (m_dir.path() / "run").string());
+    testsupport::ScopedEnv mutexes("CORVANE_MUTEX_DIR", (m_dir.path() / "mutex").string());
+    {
+        testsupport::SorvikProcess slow(SORVIK_SERVER, {"--apply-delay-ms", "60000"}, m_dir.path() / "slow.out");
+        ASSERT_TRUE(slow.WaitUntilServing(""));
+        ASSERT_TRUE(Commit(store, 2).Said("committed"));
+        EXPECT_EQ(slow.Stop(SIGKILL), 128 + SIGKILL);
+    }
+    // It took up what it found at its start, and was killed before the commit.
+    const std::vector<long> before = Applied(FileText(m_dir.path() / "slow.out"));
+    ASSERT_EQ(before.size(), 1u) << FileText(m_dir.path() / "slow.out");
+    EXPECT_EQ(Held(store), "generation=2");
+
+    const auto output = m_dir.path() / "next.out";
+    testsupport::SorvikProcess next(SORVIK_SERVER, {}, output);
+    ASSERT_TRUE(next.WaitUntilServing(""));
+    const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(10);
+    while (Applied(FileText(output)).empty() && std::chrono::steady_clock::now() < deadline)
+        std::this_thread::sleep_for(std::chrono::milliseconds(20));
+    const std::vector<long> after = Applied(FileText(output));
+    ASSERT_FALSE(after.empty()) << FileText(output);
+    EXPECT_GT(after.back(), before.front()) << "the next server takes the commit up";
+    EXPECT_EQ(next.Stop(SIGTERM), 0);
 }
 
 } // namespace
