@@ -100,6 +100,23 @@ TEST_F(FramedPair, ReceivesOneRecordPerCall)
     EXPECT_EQ(framed->Receive(received, 0), kResultTimeout);
 }
 
+TEST_F(FramedPair, RecordsAcrossEveryReadBoundaryArriveWhole)
+{
+    // Sizes around the socket's read-ahead put a header across the end of one
+    // read, and a large payload partly in the read-ahead, partly behind it.
+    const std::vector<std::size_t> sizes = {4090, 1, 4088, 100000, 0, 4096, 3, 5000};
+    std::string stream;
+    for (const std::size_t size : sizes)
+        stream += Frame(std::string(size, char('a' + size % 26)));
+    for (std::size_t at = 0; at < stream.size(); at += 60000)
+        Write(stream.substr(at, 60000));
+    for (const std::size_t size : sizes) {
+        ASSERT_EQ(framed->Receive(received, 1000), kResultOk) << size;
+        EXPECT_EQ(Text(received), std::string(size, char('a' + size % 26)));
+    }
+    EXPECT_EQ(framed->Receive(received, 0), kResultTimeout);
+}
+
 TEST_F(FramedPair, ARecordCutShortIsCompletedByTheNextCall)
 {
     const std::string frame = Frame("split record");
