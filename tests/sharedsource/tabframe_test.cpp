@@ -134,7 +134,9 @@ protected:
     GuardedTabs &Tabs() { return m_frame->m_tabs; }
     static void Press(Qt::Key key, Qt::KeyboardModifiers modifiers = Qt::NoModifier)
     {
-        QTest::keyClick(QApplication::focusWidget(), key, modifiers);
+        QWidget *focused = QApplication::focusWidget();
+        ASSERT_NE(focused, nullptr) << "nothing has the keyboard";
+        QTest::keyClick(focused, key, modifiers);
     }
     bool Open() const { return m_frame->isVisible(); }
 
@@ -186,17 +188,18 @@ TEST_F(TabFrame, EscapeDuringARenameEndsOnlyTheRename)
     item->setFlags(item->flags() | Qt::ItemIsEditable);
     tree.setFocus();
     tree.editItem(item);
-    ASSERT_NE(qobject_cast<QLineEdit *>(QApplication::focusWidget()), nullptr) << "the label editor";
-    QTest::keyClicks(QApplication::focusWidget(), QStringLiteral("X"));
-    Press(Qt::Key_Escape);
+    auto *first = uitest::LabelEditor(tree);
+    ASSERT_NE(first, nullptr) << "the label editor";
+    QTest::keyClicks(first, QStringLiteral("X"));
+    QTest::keyClick(first, Qt::Key_Escape);
     EXPECT_TRUE(Open()) << "Escape went to the label editor";
     EXPECT_EQ(item->text(0), QStringLiteral("Data"));
     tree.editItem(item);
-    auto *editor = qobject_cast<QLineEdit *>(QApplication::focusWidget());
-    ASSERT_NE(editor, nullptr) << QApplication::focusWidget()->metaObject()->className();
+    auto *editor = uitest::LabelEditor(tree);
+    ASSERT_NE(editor, nullptr) << "the label editor";
     editor->selectAll();
     QTest::keyClicks(editor, QStringLiteral("Renamed"));
-    Press(Qt::Key_Return);
+    QTest::keyClick(editor, Qt::Key_Return);
     EXPECT_TRUE(Open()) << "Enter went to the label editor";
     EXPECT_TRUE(QTest::qWaitFor([item] { return item->text(0) == QStringLiteral("Renamed"); })) << "committed";
 }
