@@ -26,7 +26,7 @@ namespace {
 using namespace sharedsource;
 using Lines = std::vector<std::string>;
 
-constexpr int kTabs = 100, kPageEdit = 200, kPageTree = 201;
+constexpr int kTabs = 100, kPageEdit = 200, kPageTree = 201, kPagePlaceholder = 202;
 
 DialogTemplate FrameTemplate()
 {
@@ -52,6 +52,7 @@ DialogTemplate PageTemplate()
     t.fontFace = QStringLiteral("DejaVu Sans Mono");
     t.pointSize = 14;
     t.controls = {
+        {kPagePlaceholder, ControlKind::Placeholder, {}, QRect(200, 2, 30, 10)},
         {kPageEdit, ControlKind::Edit, {}, QRect(10, 10, 100, 12)},
         {kPageTree, ControlKind::Tree, {}, QRect(10, 30, 100, 60)},
     };
@@ -154,6 +155,17 @@ TEST_F(TabFrame, PagesAreBuiltFromTheirTemplatesWithTheHostFont)
     EXPECT_EQ(page.font().pointSize(), 9);
     EXPECT_EQ(page.Edit().geometry(), DialogUnitsOf(page.font()).ToPixels(QRect(10, 10, 100, 12)));
     EXPECT_FALSE(page.isWindow());
+}
+
+TEST_F(TabFrame, TabGoesFromTheStripIntoThePageAndFromItsEndToTheButtons)
+{
+    Tabs().tabBar()->setFocus();
+    Press(Qt::Key_Tab);
+    EXPECT_EQ(QApplication::focusWidget(), &m_frame->keeping->Edit()) << "the strip leads into the page";
+    Press(Qt::Key_Tab);
+    EXPECT_EQ(QApplication::focusWidget(), &m_frame->keeping->Tree());
+    Press(Qt::Key_Tab);
+    EXPECT_EQ(QApplication::focusWidget(), &GetControl<QWidget>(m_frame.get(), IDOK)) << "past the page's end";
 }
 
 TEST_F(TabFrame, PagesThatKeepEnterAndEscapeLeaveTheDialogOpen)
