@@ -3,6 +3,7 @@
 // for a move that never happened.
 
 #include "referencesorvik.h"
+#include "support/refcountedfake.h"
 
 #include "serverlibs/opensorvik.h"
 
@@ -16,19 +17,11 @@ using cv::vekex::IStringList;
 using krn::WString;
 
 // The reference view, except that it has no lists of excluded folders.
-class NoExclusionListView final : public IConfigurationView
+class NoExclusionListView final : public testsupport::RefCountedFake<IConfigurationView>
 {
 public:
     explicit NoExclusionListView(krn::RefPtr<IConfigurationView> view) : m_view(std::move(view)) {}
 
-    std::uint32_t AddRef() override { return ++m_refs; }
-    std::uint32_t Release() override
-    {
-        const std::uint32_t left = --m_refs;
-        if (left == 0)
-            delete this;
-        return left;
-    }
 
     IStringList *ListExcludedFolders(const WString &, std::int32_t *) override { return nullptr; }
 
@@ -60,25 +53,15 @@ public:
     }
 
 private:
-    ~NoExclusionListView() = default;
     krn::RefPtr<IConfigurationView> m_view;
-    std::uint32_t m_refs = 1;
 };
 
 // The reference Sorvik object handing out that view.
-class NoExclusionListSorvik final : public cv::rovo::ISorvik
+class NoExclusionListSorvik final : public testsupport::RefCountedFake<cv::rovo::ISorvik>
 {
 public:
     explicit NoExclusionListSorvik(krn::RefPtr<cv::rovo::ISorvik> sorvik) : m_sorvik(std::move(sorvik)) {}
 
-    std::uint32_t AddRef() override { return ++m_refs; }
-    std::uint32_t Release() override
-    {
-        const std::uint32_t left = --m_refs;
-        if (left == 0)
-            delete this;
-        return left;
-    }
     WString GetSorvikName(std::int32_t *s) override { return m_sorvik->GetSorvikName(s); }
     IConfigurationView *GetConfigurationView(std::int32_t *s) override
     {
@@ -93,9 +76,7 @@ public:
     void ResetSorvik(std::int32_t m, std::int32_t f, std::int32_t *s) override { m_sorvik->ResetSorvik(m, f, s); }
 
 private:
-    ~NoExclusionListSorvik() = default;
     krn::RefPtr<cv::rovo::ISorvik> m_sorvik;
-    std::uint32_t m_refs = 1;
 };
 
 TEST_F(ReferenceSorvik, EditMovesAnAreaWhoseExclusionListIsNull)

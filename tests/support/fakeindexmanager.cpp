@@ -41,14 +41,6 @@ std::vector<FakeIndexManager::Clock::time_point> FakeIndexManager::CallEnds() co
     return m_ends;
 }
 
-std::uint32_t FakeIndexManager::Release()
-{
-    const std::uint32_t left = --m_refs;
-    if (left == 0)
-        delete this;
-    return left;
-}
-
 void FakeIndexManager::WaitForUpdate(std::int32_t *status)
 {
     std::unique_lock<std::mutex> lock(m_lock);

@@ -5,6 +5,7 @@
 // caller until the test lets it go. Safe to call from any thread.
 
 #include "sorvik/rovoapi.h"
+#include "support/refcountedfake.h"
 
 #include <atomic>
 #include <chrono>
@@ -16,7 +17,7 @@
 
 namespace testsupport {
 
-class FakeIndexManager final : public cv::rovo::IIndexManager
+class FakeIndexManager final : public RefCountedFake<cv::rovo::IIndexManager>
 {
 public:
     using Clock = std::chrono::steady_clock;
@@ -38,10 +39,6 @@ public:
     int Calls() const;
     std::vector<Clock::time_point> CallStarts() const;
     std::vector<Clock::time_point> CallEnds() const;
-    std::uint32_t References() const { return m_refs.load(); }
-
-    std::uint32_t AddRef() override { return ++m_refs; }
-    std::uint32_t Release() override;
 
     void WaitForUpdate(std::int32_t *status) override;
 
@@ -60,9 +57,8 @@ public:
 
 private:
     FakeIndexManager() = default;
-    ~FakeIndexManager() = default;
+    ~FakeIndexManager() override = default;
 
-    std::atomic<std::uint32_t> m_refs{1};
     mutable std::mutex m_lock;
     std::condition_variable m_changed;
     std::deque<Answer> m_answers;

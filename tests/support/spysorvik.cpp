@@ -1,7 +1,8 @@
 #include "support/spysorvik.h"
 
+#include "support/refcountedfake.h"
+
 #include <algorithm>
-#include <atomic>
 
 namespace testsupport {
 
@@ -33,23 +34,14 @@ std::string Texts(IStringList *list)
 }
 
 template <typename Interface>
-class Spy : public Interface
+class Spy : public RefCountedFake<Interface>
 {
 public:
     Spy(RefPtr<Interface> real, std::shared_ptr<CallLog> log) : m_real(std::move(real)), m_log(std::move(log)) {}
 
-    std::uint32_t AddRef() override { return ++m_refs; }
-    std::uint32_t Release() override
-    {
-        const std::uint32_t left = --m_refs;
-        if (left == 0)
-            delete this;
-        return left;
-    }
     Interface *Real() const { return m_real.get(); }
 
 protected:
-    virtual ~Spy() = default;
     bool Enter(std::string_view operation, std::int32_t *status, const std::vector<std::string> &arguments = {})
     {
         return m_log->Enter(operation, status, arguments);
@@ -57,9 +49,6 @@ protected:
 
     RefPtr<Interface> m_real;
     std::shared_ptr<CallLog> m_log;
-
-private:
-    std::atomic<std::uint32_t> m_refs{1};
 };
 
 class SpyEditor final : public Spy<rovo::IConfigurationEditor>
