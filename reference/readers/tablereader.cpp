@@ -152,6 +152,8 @@ void TableReader::SetProperty(std::vector<Property> &element, std::string_view n
     if (m_properties >= kMaxFileProperties)
         Fail("more than " + std::to_string(kMaxFileProperties) + " properties in one file");
     ++m_properties;
+    if (element.empty())
+        element.reserve(4);
     element.push_back({std::string(name), std::string(value), Classify(value)});
 }
 

@@ -79,8 +79,15 @@ ReadResult ReadWithDeadline(const std::string &path, std::chrono::steady_clock::
     struct stat info;
     if (::fstat(file.get(), &info) != 0)
         return Failed("cannot look at the file");
+    ReadResult result;
+    result.size = std::int64_t(info.st_size);
+    result.modifiedNs = std::int64_t(info.st_mtim.tv_sec) * 1000000000 + info.st_mtim.tv_nsec;
     if (!S_ISREG(info.st_mode) && !S_ISFIFO(info.st_mode) && !S_ISCHR(info.st_mode))
-        return {ReadOutcome::Unreadable, "not a file that can be read"};
+    {
+        result.outcome = ReadOutcome::Unreadable;
+        result.why = "not a file that can be read";
+        return result;
+    }
     const bool mayWait = !S_ISREG(info.st_mode);
     if (buffer.size() < kPieceBytes)
         buffer.resize(kPieceBytes);
@@ -89,22 +96,28 @@ ReadResult ReadWithDeadline(const std::string &path, std::chrono::steady_clock::
         if (mayWait) {
             switch (WaitReadable(file.get(), deadline, interruption)) {
             case Readiness::TimedOut:
-                return {ReadOutcome::TimedOut, {}};
+                result.outcome = ReadOutcome::TimedOut;
+                return result;
             case Readiness::Stopped:
-                return {ReadOutcome::Stopped, {}};
+                result.outcome = ReadOutcome::Stopped;
+                return result;
             case Readiness::Ready:
                 break;
             }
         } else if (std::chrono::steady_clock::now() >= deadline) {
-            return {ReadOutcome::TimedOut, {}};
+            result.outcome = ReadOutcome::TimedOut;
+            return result;
         }
         const ssize_t got = ::read(file.get(), buffer.data(), buffer.size());
         if (got == 0)
-            return {ReadOutcome::Complete, {}};
+            return result;
         if (got < 0) {
             if (errno == EINTR || errno == EAGAIN || errno == EWOULDBLOCK)
                 continue;
-            return Failed("cannot read the file");
+            const ReadResult failed = Failed("cannot read the file");
+            result.outcome = failed.outcome;
+            result.why = failed.why;
+            return result;
         }
         consume(std::string_view(buffer.data(), std::size_t(got)));
     }

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <chrono>
+#include <cstdint>
 #include <functional>
 #include <string>
 #include <string_view>
@@ -20,6 +21,9 @@ struct ReadResult
 {
     ReadOutcome outcome = ReadOutcome::Complete;
     std::string why;
+    // Of the file as opened; -1 when it could not be.
+    std::int64_t size = -1;
+    std::int64_t modifiedNs = -1;
 };
 
 // Interrupts a read that waits: when wakeFd becomes readable, stopRequested

@@ -16,8 +16,8 @@ namespace {
 using Clock = std::chrono::steady_clock;
 
 // A batch is written when it is this large or this old.
-constexpr std::size_t kBatchFiles = 512;
-constexpr auto kBatchAge = std::chrono::milliseconds(200);
+constexpr std::size_t kBatchFiles = 2048;
+constexpr auto kBatchAge = std::chrono::milliseconds(500);
 
 std::int64_t NowMs()
 {
@@ -66,7 +66,8 @@ PassSummary IndexPass::Run()
     m_progress.total.store(m_progress.done.load() + 1);
     m_progress.lastMs.store(NowMs());
 
-    std::unordered_map<std::string, FileSignature> known = m_records.Snapshot(m_epoch);
+    m_known = m_records.Snapshot(m_epoch);
+    std::unordered_map<std::string, FileSignature> &known = m_known;
     std::vector<Candidate> candidates;
     if (!Walk(candidates))
         return summary;
@@ -80,12 +81,14 @@ PassSummary IndexPass::Run()
         if (m_hooks.stopRequested && m_hooks.stopRequested())
             return summary;
         const auto found = known.find(candidate.path);
-        const bool current = found != known.end() && found->second == candidate.signature;
-        if (found != known.end())
+        const bool knew = found != known.end();
+        const bool current = knew && candidate.stated && found->second == candidate.signature;
+        if (knew)
             known.erase(found);
         if (!current) {
             bool stopped = false;
             FileOutcome outcome = Read(candidate, stopped);
+            outcome.known = knew;
             if (stopped)
                 return summary;
             ++summary.read;
@@ -169,9 +172,15 @@ void IndexPass::WalkArea(const IndexPlan::Area &area, std::vector<Candidate> &ca
             const std::string *parselet = m_plan.ParseletFor(name);
             if (!parselet || !readers::HasReader(*parselet))
                 continue;
-            if (!stated && ::fstatat(directory.Fd(), entry->d_name, &info, AT_SYMLINK_NOFOLLOW) != 0)
-                continue;
-            candidates.push_back({prefix + std::string(name), {std::int64_t(info.st_size), ModifiedNs(info), *parselet}});
+            Candidate candidate{prefix + std::string(name), {0, 0, *parselet}, false};
+            if (m_known.count(candidate.path)) {
+                if (!stated && ::fstatat(directory.Fd(), entry->d_name, &info, AT_SYMLINK_NOFOLLOW) != 0)
+                    continue;
+                candidate.signature.size = std::int64_t(info.st_size);
+                candidate.signature.mtime = ModifiedNs(info);
+                candidate.stated = true;
+            }
+            candidates.push_back(std::move(candidate));
         }
     }
 }
@@ -186,6 +195,12 @@ FileOutcome IndexPass::Read(const Candidate &candidate, bool &stopped)
         const ReadResult result =
             ReadWithDeadline(candidate.path, Clock::now() + m_fileTimeout, m_hooks.interruption, m_buffer,
                              [&reader](std::string_view bytes) { reader->Feed(bytes); });
+        if (result.size >= 0) {
+            outcome.signature.size = result.size;
+            outcome.signature.mtime = result.modifiedNs;
+        } else if (!candidate.stated) {
+            outcome.signature.mtime = -1; // not opened, so not looked at: tried again next time
+        }
         switch (result.outcome) {
         case ReadOutcome::Complete:
             outcome.content = reader->Finish();

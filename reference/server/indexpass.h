@@ -59,6 +59,9 @@ private:
     {
         std::string path;
         FileSignature signature;
+        // Whether the walk looked at its size and time: only for files the
+        // index knows; a new file is read anyway, and looked at then.
+        bool stated = false;
     };
 
     bool Walk(std::vector<Candidate> &candidates);
@@ -72,6 +75,7 @@ private:
     Hooks m_hooks;
     IndexProgress &m_progress;
     std::uint64_t m_epoch = 0;
+    std::unordered_map<std::string, FileSignature> m_known; // as the pass began
     std::vector<char> m_buffer;
 };
 

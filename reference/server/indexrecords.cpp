@@ -2,6 +2,8 @@
 
 #include "sorvik/rovoapi.h"
 
+#include <array>
+#include <charconv>
 #include <map>
 
 namespace sorvik::server {
@@ -13,7 +15,15 @@ namespace status = cv::rovo::status;
 
 constexpr std::uint32_t kFiles = 8, kGroups = 16, kChannels = 32;
 
-// The statistics a change of files moves, summed over one transaction.
+// How the elements carrying one property change: in all, and by data type.
+struct PropertyDelta
+{
+    std::int64_t occurrences = 0;
+    std::array<std::int64_t, 4> byType{};
+};
+
+// The statistics and the level summary a change of files moves, summed over
+// one transaction.
 struct Deltas
 {
     std::int64_t files = 0;
@@ -21,6 +31,7 @@ struct Deltas
     std::int64_t channels = 0;
     std::int64_t failures = 0;
     std::map<std::string, std::int64_t> timeouts; // per Parselet
+    std::map<std::pair<int, std::string>, PropertyDelta> properties;
 
     void Count(int outcome, const std::string &parselet, std::int64_t channelCount, int sign)
     {
@@ -36,6 +47,25 @@ struct Deltas
         case FileOutcomeKind::Failed:
             failures += sign;
             break;
+        }
+    }
+
+    void CountProperty(int level, const std::string &name, int type, int sign)
+    {
+        PropertyDelta &delta = properties[{level, name}];
+        delta.occurrences += sign;
+        delta.byType[std::size_t(type & 3)] += sign;
+    }
+
+    void CountProperties(const readers::TableContent &content, int sign)
+    {
+        for (const readers::Property &property : content.fileProperties)
+            CountProperty(0, property.name, int(property.type), sign);
+        for (const readers::Property &property : content.groupProperties)
+            CountProperty(1, property.name, int(property.type), sign);
+        for (const readers::Channel &channel : content.channels) {
+            for (const readers::Property &property : channel.properties)
+                CountProperty(2, property.name, int(property.type), sign);
         }
     }
 
@@ -65,6 +95,28 @@ struct Deltas
         }
         if (!timeouts.empty())
             db.Exec("DELETE FROM parselet_timeouts WHERE count <= 0");
+        ApplyProperties(db);
+    }
+
+    void ApplyProperties(rovo::Db &db) const
+    {
+        Statement summary(db, "INSERT INTO level_properties(level, name, occurrences, integers, numerics, times, strings) "
+                              "VALUES (?1, ?2, ?3, ?4, ?5, ?6, ?7) ON CONFLICT(level, name) DO UPDATE SET "
+                              "occurrences = occurrences + ?3, integers = integers + ?4, numerics = numerics + ?5, "
+                              "times = times + ?6, strings = strings + ?7");
+        bool dropped = false;
+        for (const auto &[key, delta] : properties) {
+            if (delta.occurrences == 0 && delta.byType == std::array<std::int64_t, 4>{})
+                continue;
+            dropped = dropped || delta.occurrences < 0;
+            summary.Bind(1, std::int64_t(key.first)).BindUtf8(2, key.second).Bind(3, delta.occurrences);
+            for (std::size_t type = 0; type < 4; ++type)
+                summary.Bind(int(4 + type), delta.byType[type]);
+            summary.Run();
+            summary.Reset();
+        }
+        if (dropped)
+            db.Exec("DELETE FROM level_properties WHERE occurrences <= 0");
     }
 };
 
@@ -72,75 +124,115 @@ struct Deltas
 struct RecordStatements
 {
     explicit RecordStatements(rovo::Db &db)
-        : old(db, "SELECT id, outcome, parselet, channels FROM files WHERE path = ?1"),
-          dropProperties(db, "DELETE FROM properties WHERE file_id = ?1"),
-          dropFile(db, "DELETE FROM files WHERE id = ?1"),
-          upsert(db, "INSERT INTO files(path, size, mtime, parselet, outcome, channels, detail) "
-                     "VALUES (?1, ?2, ?3, ?4, ?5, ?6, ?7) ON CONFLICT(path) DO UPDATE SET size = excluded.size, "
-                     "mtime = excluded.mtime, parselet = excluded.parselet, outcome = excluded.outcome, "
-                     "channels = excluded.channels, detail = excluded.detail RETURNING id"),
-          property(db, "INSERT OR REPLACE INTO properties(file_id, level, element, name, value, type) "
-                       "VALUES (?1, ?2, ?3, ?4, ?5, ?6)")
+        : old(db, "SELECT outcome, parselet, channels, properties FROM files WHERE path = ?1"),
+          oldProperties(db, "SELECT json_extract(value, '$[0]'), json_extract(value, '$[2]'), "
+                            "json_extract(value, '$[4]') FROM json_each(?1)"),
+          drop(db, "DELETE FROM files WHERE path = ?1"),
+          write(db, "INSERT OR REPLACE INTO files(path, size, mtime, parselet, outcome, channels, detail, properties) "
+                    "VALUES (?1, ?2, ?3, ?4, ?5, ?6, ?7, ?8)")
     {
     }
 
-    // Forgets what the index held of the file; false when it held nothing.
-    bool Forget(const std::string &path, Deltas &deltas, bool dropRow)
+    // Takes what the index held of the file out of the statistics; false
+    // when it held nothing.
+    bool Forget(const std::string &path, Deltas &deltas)
     {
         old.BindUtf8(1, path);
-        const bool known = old.Step();
-        if (known) {
-            const std::int64_t id = old.Int(0);
-            deltas.Count(int(old.Int(1)), old.Utf8(2), old.Int(3), -1);
+        if (!old.Step()) {
             old.Reset();
-            dropProperties.Bind(1, id).Run();
-            dropProperties.Reset();
-            if (dropRow) {
-                dropFile.Bind(1, id).Run();
-                dropFile.Reset();
-            }
-        } else {
-            old.Reset();
+            return false;
         }
-        return known;
+        deltas.Count(int(old.Int(0)), old.Utf8(1), old.Int(2), -1);
+        const std::string properties = old.Utf8(3);
+        old.Reset();
+        oldProperties.BindUtf8(1, properties);
+        while (oldProperties.Step())
+            deltas.CountProperty(int(oldProperties.Int(0)), oldProperties.Utf8(1), int(oldProperties.Int(2)), -1);
+        oldProperties.Reset();
+        return true;
+    }
+
+    void Remove(const std::string &path, Deltas &deltas)
+    {
+        if (!Forget(path, deltas))
+            return;
+        drop.BindUtf8(1, path).Run();
+        drop.Reset();
     }
 
     void Write(const FileOutcome &outcome, Deltas &deltas)
     {
-        Forget(outcome.path, deltas, false);
-        const std::int64_t channels = std::int64_t(outcome.content.channels.size());
-        upsert.BindUtf8(1, outcome.path)
+        if (outcome.known)
+            Forget(outcome.path, deltas);
+        const bool indexed = outcome.kind == FileOutcomeKind::Indexed;
+        const std::int64_t channels = indexed ? std::int64_t(outcome.content.channels.size()) : 0;
+        const std::string properties = indexed ? PropertiesJson(outcome.content) : std::string("[]");
+        write.BindUtf8(1, outcome.path)
             .Bind(2, outcome.signature.size)
             .Bind(3, outcome.signature.mtime)
             .BindUtf8(4, outcome.signature.parselet)
             .Bind(5, std::int64_t(outcome.kind))
-            .Bind(6, outcome.kind == FileOutcomeKind::Indexed ? channels : 0)
-            .BindUtf8(7, outcome.detail);
-        upsert.Step();
-        const std::int64_t id = upsert.Int(0);
-        upsert.Reset();
+            .Bind(6, channels)
+            .BindUtf8(7, outcome.detail)
+            .BindUtf8(8, properties);
+        write.Run();
+        write.Reset();
         deltas.Count(int(outcome.kind), outcome.signature.parselet, channels, +1);
-        if (outcome.kind != FileOutcomeKind::Indexed)
-            return;
-        const readers::TableContent &content = outcome.content;
-        WriteProperties(id, 0, 0, content.fileProperties);
-        WriteProperties(id, 1, 0, content.groupProperties);
-        for (std::size_t channel = 0; channel < content.channels.size(); ++channel)
-            WriteProperties(id, 2, std::int64_t(channel), content.channels[channel].properties);
+        if (indexed)
+            deltas.CountProperties(outcome.content, +1);
     }
 
-    void WriteProperties(std::int64_t id, int level, std::int64_t element, const std::vector<readers::Property> &properties)
-    {
-        for (const readers::Property &p : properties) {
-            property.Bind(1, id).Bind(2, level).Bind(3, element).BindUtf8(4, p.name).BindUtf8(5, p.value).Bind(
-                6, std::int64_t(p.type));
-            property.Run();
-            property.Reset();
+    Statement old, oldProperties, drop, write;
+};
+
+void AppendJsonString(std::string &json, std::string_view text)
+{
+    json.push_back('"');
+    for (const char c : text) {
+        switch (c) {
+        case '"':
+            json += "\\\"";
+            break;
+        case '\\':
+            json += "\\\\";
+            break;
+        default:
+            if (static_cast<unsigned char>(c) < 0x20) {
+                static constexpr char kHex[] = "0123456789abcdef";
+                json += "\\u00";
+                json.push_back(kHex[(c >> 4) & 0xF]);
+                json.push_back(kHex[c & 0xF]);
+            } else {
+                json.push_back(c);
+            }
         }
     }
+    json.push_back('"');
+}
 
-    Statement old, dropProperties, dropFile, upsert, property;
-};
+void AppendNumber(std::string &json, std::size_t number)
+{
+    char digits[24];
+    const auto [end, error] = std::to_chars(digits, digits + sizeof digits, number);
+    json.append(digits, end);
+}
+
+void AppendProperties(std::string &json, int level, std::size_t element, const std::vector<readers::Property> &properties)
+{
+    for (const readers::Property &property : properties) {
+        json += json.size() > 1 ? ",[" : "[";
+        json.push_back(char('0' + level));
+        json.push_back(',');
+        AppendNumber(json, element);
+        json.push_back(',');
+        AppendJsonString(json, property.name);
+        json.push_back(',');
+        AppendJsonString(json, property.value);
+        json.push_back(',');
+        json.push_back(char('0' + int(property.type)));
+        json.push_back(']');
+    }
+}
 
 void SetMeta(rovo::Db &db, const char *name, const std::string &value)
 {
@@ -159,17 +251,28 @@ std::optional<std::string> Meta(rovo::Db &db, const char *name)
 
 } // namespace
 
+std::string PropertiesJson(const readers::TableContent &content)
+{
+    std::string json;
+    json.reserve(256);
+    json.push_back('[');
+    AppendProperties(json, 0, 0, content.fileProperties);
+    AppendProperties(json, 1, 0, content.groupProperties);
+    for (std::size_t channel = 0; channel < content.channels.size(); ++channel)
+        AppendProperties(json, 2, channel, content.channels[channel].properties);
+    json.push_back(']');
+    return json;
+}
+
 void SummarizeLevelProperties(rovo::Db &db, int level)
 {
-    // A property's type is that of all its values: integers and numbers
-    // together are numeric, any other mixture a string.
-    const char *const summary =
-        "INSERT INTO level_properties(level, name, occurrences, type) "
-        "SELECT level, name, count(*), CASE WHEN min(type) = max(type) THEN min(type) "
-        "WHEN max(type) = 1 THEN 1 ELSE 3 END FROM properties WHERE ?1 < 0 OR level = ?1 GROUP BY level, name";
     Statement clear(db, "DELETE FROM level_properties WHERE ?1 < 0 OR level = ?1");
     clear.Bind(1, std::int64_t(level)).Run();
-    Statement fill(db, summary);
+    Statement fill(db, "INSERT INTO level_properties(level, name, occurrences, integers, numerics, times, strings) "
+                       "SELECT level, name, count(*), sum(type = 0), sum(type = 1), sum(type = 2), sum(type = 3) FROM "
+                       "(SELECT json_extract(p.value, '$[0]') AS level, json_extract(p.value, '$[2]') AS name, "
+                       "json_extract(p.value, '$[4]') AS type FROM files f, json_each(f.properties) p "
+                       "WHERE f.outcome = 0) WHERE ?1 < 0 OR level = ?1 GROUP BY level, name");
     fill.Bind(1, std::int64_t(level)).Run();
 }
 
@@ -197,7 +300,7 @@ bool IndexRecords::Record(std::uint64_t epoch, const std::vector<FileOutcome> &o
         for (const FileOutcome &outcome : outcomes)
             statements.Write(outcome, deltas);
         for (const std::string &path : removed)
-            statements.Forget(path, deltas, true);
+            statements.Remove(path, deltas);
         deltas.Apply(db);
         transaction.Commit();
         return true;
@@ -210,13 +313,15 @@ bool IndexRecords::Complete(std::uint64_t epoch, const std::string &planFingerpr
         if (m_status.Epoch() != epoch)
             return false;
         rovo::Transaction transaction(db, rovo::Transaction::Kind::Write, status::StoreUnavailable);
-        SummarizeLevelProperties(db, -1);
         // Optimized "with the server's default data type" before the
         // property was in the index: it gets the type now found.
-        db.Exec("UPDATE optimized_properties SET state = (SELECT CASE type WHEN 0 THEN 3 WHEN 1 THEN 10 "
-                "WHEN 2 THEN 30 ELSE 23 END FROM level_properties l WHERE l.level = optimized_properties.level "
-                "AND l.name = optimized_properties.name) WHERE state = 0 AND EXISTS (SELECT 1 FROM "
-                "level_properties l WHERE l.level = optimized_properties.level AND l.name = optimized_properties.name)");
+        const std::string resolve =
+            std::string("UPDATE optimized_properties SET state = (SELECT CASE ") + kLevelPropertyType +
+            " WHEN 0 THEN 3 WHEN 1 THEN 10 WHEN 2 THEN 30 ELSE 23 END FROM level_properties l "
+            "WHERE l.level = optimized_properties.level AND l.name = optimized_properties.name) "
+            "WHERE state = 0 AND EXISTS (SELECT 1 FROM level_properties l "
+            "WHERE l.level = optimized_properties.level AND l.name = optimized_properties.name)";
+        db.Exec(resolve.c_str());
         SetMeta(db, "plan", planFingerprint);
         SetMeta(db, "ended_ms", std::to_string(endedMs));
         transaction.Commit();

@@ -34,16 +34,20 @@ struct FileOutcome
 {
     std::string path; // local bytes
     FileSignature signature;
+    // Whether the index knew the file when the pass began. Only resets
+    // remove files meanwhile, so a file it did not know has nothing to
+    // take back.
+    bool known = true;
     FileOutcomeKind kind = FileOutcomeKind::Indexed;
     std::string detail; // why it failed
     readers::TableContent content;
 };
 
-// The indexer's tables in the index (files, the properties of their
+// The indexer's tables in the index (the files with the properties of their
 // elements, the level property summary) and the statistics that go with
-// them: every write keeps the element counts (8 files, 16 channel groups,
-// 32 channels), the time-outs per Parselet and the failure count in step
-// with the files, in the same transaction.
+// them: every write keeps the level property summary, the element counts
+// (8 files, 16 channel groups, 32 channels), the time-outs per Parselet and
+// the failure count in step with the files, in the same transaction.
 class IndexRecords
 {
 public:
@@ -57,9 +61,9 @@ public:
     bool Record(std::uint64_t epoch, const std::vector<FileOutcome> &outcomes,
                 const std::vector<std::string> &removed);
 
-    // After a completed pass: the level property summary, the plan it
-    // followed and when it ended; optimized properties that waited for their
-    // data type get it. False when the index was reset after epoch.
+    // After a completed pass: the plan it followed and when it ended;
+    // optimized properties that waited for their data type get it. False
+    // when the index was reset after epoch.
     bool Complete(std::uint64_t epoch, const std::string &planFingerprint, std::int64_t endedMs);
 
     // The last completed pass, if any: its plan and when it ended.
@@ -77,8 +81,20 @@ private:
     IndexStatus &m_status;
 };
 
-// Rebuilds the summary of one level (0 file, 1 channel group, 2 channel), or
-// of all with -1, from the element properties. With the index locked.
+// Counts the level property summary of one level (0 file, 1 channel group,
+// 2 channel), or of all with -1, anew from the properties of the files.
+// With the index locked.
 void SummarizeLevelProperties(rovo::Db &db, int level);
+
+// The data type (0 integer, 1 numeric, 2 time, 3 string) of a row of
+// level_properties, in SQL: integers and numbers together are numeric, any
+// other mixture a string.
+inline constexpr const char *kLevelPropertyType =
+    "CASE WHEN strings > 0 OR (times > 0 AND integers + numerics > 0) THEN 3 WHEN times > 0 THEN 2 "
+    "WHEN numerics > 0 THEN 1 ELSE 0 END";
+
+// The properties of a file's elements as the index keeps them: a JSON
+// array of [level, element, name, value, type].
+std::string PropertiesJson(const readers::TableContent &content);
 
 } // namespace sorvik::server

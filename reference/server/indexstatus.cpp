@@ -27,19 +27,19 @@ const char *const kSchema[] = {
     "CREATE TABLE IF NOT EXISTS parselet_timeouts(parselet TEXT PRIMARY KEY, count INTEGER NOT NULL)",
     // One row per file the indexer looked at. outcome: 0 indexed, 1 timed
     // out, 2 failed (detail says why); mtime -1 asks for reading it again.
-    "CREATE TABLE IF NOT EXISTS files(id INTEGER PRIMARY KEY, path TEXT NOT NULL UNIQUE,"
-    " size INTEGER NOT NULL, mtime INTEGER NOT NULL, parselet TEXT NOT NULL, outcome INTEGER NOT NULL,"
-    " channels INTEGER NOT NULL, detail TEXT NOT NULL)",
-    // The properties of the elements of indexed files. level: 0 file,
-    // 1 channel group, 2 channel (element = its position); type: 0 integer,
-    // 1 numeric, 2 time, 3 string.
-    "CREATE TABLE IF NOT EXISTS properties(file_id INTEGER NOT NULL, level INTEGER NOT NULL,"
-    " element INTEGER NOT NULL, name TEXT NOT NULL, value TEXT NOT NULL, type INTEGER NOT NULL,"
-    " PRIMARY KEY (file_id, level, element, name)) WITHOUT ROWID",
-    // The properties of each level with their occurrences and data type, as
-    // of the last indexing or occurrence count.
+    // properties: the properties of its elements as a JSON array of
+    // [level, element, name, value, type], level 0 the file, 1 the channel
+    // group, 2 a channel (element: its position); type 0 integer, 1 numeric,
+    // 2 time, 3 string. One row per file keeps indexing fast; json_each()
+    // reads them.
+    "CREATE TABLE IF NOT EXISTS files(path TEXT PRIMARY KEY, size INTEGER NOT NULL, mtime INTEGER NOT NULL,"
+    " parselet TEXT NOT NULL, outcome INTEGER NOT NULL, channels INTEGER NOT NULL, detail TEXT NOT NULL,"
+    " properties TEXT NOT NULL) WITHOUT ROWID",
+    // The properties of each level: the elements that carry each, by the
+    // data type of their values; kept in step with the files.
     "CREATE TABLE IF NOT EXISTS level_properties(level INTEGER NOT NULL, name TEXT NOT NULL,"
-    " occurrences INTEGER NOT NULL, type INTEGER NOT NULL, PRIMARY KEY (level, name)) WITHOUT ROWID",
+    " occurrences INTEGER NOT NULL, integers INTEGER NOT NULL, numerics INTEGER NOT NULL, times INTEGER NOT NULL,"
+    " strings INTEGER NOT NULL, PRIMARY KEY (level, name)) WITHOUT ROWID",
     "CREATE TABLE IF NOT EXISTS optimized_properties(level INTEGER NOT NULL, name TEXT NOT NULL,"
     " state INTEGER NOT NULL, PRIMARY KEY (level, name)) WITHOUT ROWID",
     "CREATE TABLE IF NOT EXISTS index_meta(name TEXT PRIMARY KEY, value TEXT NOT NULL) WITHOUT ROWID",
@@ -231,7 +231,6 @@ void IndexStatus::ResetIndex(bool configurationToo)
     m_db->Exec("DELETE FROM element_counts;"
                "DELETE FROM parselet_timeouts;"
                "DELETE FROM files;"
-               "DELETE FROM properties;"
                "DELETE FROM level_properties;"
                "DELETE FROM index_meta;"
                "UPDATE counters SET value = 0 WHERE name IN ('disk_full_crawl_stop', 'failures', 'not_my_file')");

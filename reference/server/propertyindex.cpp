@@ -142,7 +142,9 @@ void PropertyIndex::Optimize(int level, const QString &name, std::uint32_t state
     m_status.WithIndex([&](rovo::Db &db) {
         std::uint32_t resolved = state;
         if (state == cv::rovo::kOptimizedDefault) {
-            Statement type(db, "SELECT type FROM level_properties WHERE level = ?1 AND name = ?2");
+            const std::string sql =
+                std::string("SELECT ") + kLevelPropertyType + " FROM level_properties WHERE level = ?1 AND name = ?2";
+            Statement type(db, sql.c_str());
             type.Bind(1, std::int64_t(level)).Bind(2, name);
             if (type.Step())
                 resolved = StateOfType(int(type.Int(0)));

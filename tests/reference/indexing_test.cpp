@@ -103,7 +103,7 @@ TEST_F(IndexingProcessTest, APriorityChangeMakesTxtFilesReadByTheOtherReader)
     });
     WaitUntilIndexed();
     EXPECT_EQ(Counts(), (ElementCounts{1, 1, 3}));
-    EXPECT_EQ(StatusValue("SELECT count(*) FROM properties WHERE level = 0"), 2) << "title and operator";
+    EXPECT_EQ(StatusValue("SELECT count(*) FROM level_properties WHERE level = 0"), 2) << "title and operator";
     EXPECT_EQ(StatusValue("SELECT count(*) FROM files WHERE parselet = 'TextTable'"), 1);
 }
 
