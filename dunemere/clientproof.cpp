@@ -60,22 +60,18 @@ std::u16string ComputeClientProof(std::u16string_view secretKey, std::u16string_
     return std::u16string(hex, hex + sizeof hex);
 }
 
-std::array<std::u16string, 2> PermissionParameters(std::u16string_view identification,
-                                                   std::u16string_view secretKey, const GUID &requestIdentifier)
-{
-    if (identification.empty() || secretKey.empty())
-        return {};
-    return {std::u16string(identification), ComputeClientProof(secretKey, identification, requestIdentifier)};
-}
-
 void AddPermissionParameters(tRequestTransferData &request, std::u16string_view identification,
                              std::u16string_view secretKey)
 {
     if (request.Version() < sorvik::PackVersion(3, 1, 1))
         return;
-    auto parameters = PermissionParameters(identification, secretKey, request.RequestIdentifier());
-    for (auto &parameter : parameters)
-        request.AppendParameter(std::move(parameter));
+    if (identification.empty() || secretKey.empty()) {
+        request.AppendParameter({});
+        request.AppendParameter({});
+        return;
+    }
+    request.AppendParameter(std::u16string(identification));
+    request.AppendParameter(ComputeClientProof(secretKey, identification, request.RequestIdentifier()));
 }
 
 } // namespace cv::vek::rovo

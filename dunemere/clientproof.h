@@ -2,7 +2,6 @@
 
 #include "sorvik/com.h"
 
-#include <array>
 #include <cstdint>
 #include <span>
 #include <string>
@@ -22,15 +21,11 @@ std::string HmacSha256Hex(std::span<const std::uint8_t> key, std::span<const std
 std::u16string ComputeClientProof(std::u16string_view secretKey, std::u16string_view identification,
                                   const GUID &requestIdentifier);
 
-// The two parameters of a permission request: the identification and its
-// proof for the given request identifier, or two empty texts when either
-// identification or key is empty.
-std::array<std::u16string, 2> PermissionParameters(std::u16string_view identification,
-                                                   std::u16string_view secretKey, const GUID &requestIdentifier);
-
-// Appends the permission parameters to a permission request whose version
-// expects them (3.1.1 and later); older versions get none. Call it after the
-// request's identifier is final: the proof depends on it.
+// Appends the two parameters of a permission request whose version expects
+// them (3.1.1 and later; older versions get none): the identification and its
+// proof for the request's identifier, or two empty texts when either
+// identification or key is empty. Call it after the request's identifier is
+// final: the proof depends on it.
 void AddPermissionParameters(tRequestTransferData &request, std::u16string_view identification,
                              std::u16string_view secretKey);
 

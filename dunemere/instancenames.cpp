@@ -2,6 +2,7 @@
 
 #include "krn/osdep/pathjoin.h"
 #include "krn/osdep/registry.h"
+#include "krn/osdep/runtimefolder.h"
 
 namespace cv::vek::rovo::dunemere {
 
@@ -31,6 +32,14 @@ std::u16string ServerFolder()
 std::u16string ServerExecutablePath()
 {
     return krn::osdep::PathJoin(ServerFolder(), kServerExecutable);
+}
+
+std::filesystem::path StartedServerLogPath()
+{
+    const std::filesystem::path folder = krn::osdep::RuntimeDirectory();
+    if (!krn::osdep::EnsureTrustedFolder(folder).empty())
+        return {};
+    return folder / "Sorvik.log";
 }
 
 } // namespace cv::vek::rovo::dunemere

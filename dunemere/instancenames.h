@@ -2,6 +2,7 @@
 
 #include "krn/osdep/mutex.h"
 
+#include <filesystem>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -32,5 +33,11 @@ std::u16string ServerFolder();
 // ServerFolder() joined with the executable's name; the bare name when the
 // folder is unknown, so that the system's search path applies.
 std::u16string ServerExecutablePath();
+
+// Where the output of a local server that a client started goes:
+// "Sorvik.log" in the runtime folder of the sockets (created for this user
+// when missing). Empty when that folder cannot be trusted: the output is
+// then thrown away.
+std::filesystem::path StartedServerLogPath();
 
 } // namespace cv::vek::rovo::dunemere

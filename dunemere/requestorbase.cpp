@@ -38,7 +38,6 @@ constexpr std::int32_t kStatusNotLoggedOn = -65536;
 constexpr std::uint32_t kPermissionCategory = 4;
 constexpr std::uint32_t kPermissionCode = 3001;
 constexpr std::uint32_t kAuthenticationCode = 3002;
-constexpr std::uint32_t kClientProofVersion = sorvik::PackVersion(3, 1, 1);
 
 using comm::kResultConnectionLost;
 using comm::kResultOk;
@@ -85,6 +84,15 @@ bool StopsSend(std::uint32_t result)
 bool StopsReceive(std::uint32_t result)
 {
     return result < 0x80000000u || result == kResultTimeout;
+}
+
+// A transfer that failed gives the peer a moment before the next try. One
+// that is done yields nothing: on Linux a yield is a system call that, on a
+// busy machine, hands the rest of the time slice to whoever waits, which
+// cost more than the whole exchange.
+void YieldBeforeRetry()
+{
+    std::this_thread::yield();
 }
 
 // Releases the log-on client's reference when the log-on ends, however it ends.
@@ -180,7 +188,8 @@ bool RequestorBase::StartServerIfNeeded()
     }
 
     m_log.Info(__FILE__, __LINE__, kStartVerbosity) << "SKCP:     Sorvik is not running so we try to start it!";
-    if (!krn::osdep::StartDetachedProcess(krn::ToUtf8(dunemere::ServerExecutablePath())))
+    if (!krn::osdep::StartDetachedProcess(krn::ToUtf8(dunemere::ServerExecutablePath()),
+                                           dunemere::StartedServerLogPath()))
         throw DataCache::ToIntMsgDa(kSource, 65,
                                     u"PLUGIN: Sorvik is not running and the plugin is not able to start it!");
     m_serverStartedAt = std::chrono::steady_clock::now();
@@ -203,17 +212,8 @@ RequestorBase::Response RequestorBase::RequestPermission(bool firstAttempt, std:
         << sorvik::VersionMinor(version) << '.' << sorvik::VersionPatch(version);
 
     tRequestTransferData request(version, kPermissionCategory, kPermissionCode);
-    if (version >= kClientProofVersion) {
-        const std::u16string &identification = m_config.GetClientIdentificationString();
-        const std::u16string &secretKey = m_config.GetClientIdentificationSecretKey();
-        if (!identification.empty() && !secretKey.empty()) {
-            request.AppendParameter(identification);
-            request.AppendParameter(ComputeClientProof(secretKey, identification, request.RequestIdentifier()));
-        } else {
-            request.AppendParameter({});
-            request.AppendParameter({});
-        }
-    }
+    AddPermissionParameters(request, m_config.GetClientIdentificationString(),
+                            m_config.GetClientIdentificationSecretKey());
 
     std::uint32_t timeout = m_config.GetSendTimeout();
     if (firstAttempt && attemptsLeft == m_attemptBudget && StartServerIfNeeded())
@@ -379,8 +379,9 @@ std::uint32_t RequestorBase::SendWithRetries(krn::ByteBuffer &buffer, std::uint3
 {
     std::uint32_t result = comm::kResultFailure;
     for (int call = 0; call < kCallsPerTransfer; ++call) {
+        if (call > 0)
+            YieldBeforeRetry();
         result = Socket().Send(buffer, timeout);
-        std::this_thread::yield();
         if (StopsSend(result))
             break;
     }
@@ -391,8 +392,9 @@ std::uint32_t RequestorBase::ReceiveWithRetries(krn::ByteBuffer &buffer, std::ui
 {
     std::uint32_t result = comm::kResultFailure;
     for (int call = 0; call < kCallsPerTransfer; ++call) {
+        if (call > 0)
+            YieldBeforeRetry();
         result = Socket().Receive(buffer, timeout);
-        std::this_thread::yield();
         if (StopsReceive(result))
             break;
     }

@@ -46,6 +46,19 @@ private:
     void *m_handle;
 };
 
+// What the library can say about its last failure, as " " + its text; empty
+// when it says nothing (or cannot be asked).
+std::u16string Explanation(void *library)
+{
+    const auto lastError =
+        reinterpret_cast<comm::GetLastErrorTextFunction>(::dlsym(library, comm::kGetLastErrorTextExport));
+    if (!lastError)
+        return {};
+    cv::krn::WString text;
+    lastError(&text);
+    return text.empty() ? std::u16string() : u" " + std::u16string(text.view());
+}
+
 } // namespace
 
 std::u16string FindCommLibrary()
@@ -88,7 +101,7 @@ std::unique_ptr<rovoCommClient> rovoCommClient::Create(const std::u16string &lib
     if (newClientSocket(server, serviceName, serviceClass, &socket) != 0) {
         if (socket)
             socket->Release();
-        throw DataCache::ToIntMsgDa(kSource, 65, u"SKCP:     Unable to connect to socket!");
+        throw DataCache::ToIntMsgDa(kSource, 65, u"SKCP:     Unable to connect to socket!" + Explanation(library.Get()));
     }
     if (!socket)
         throw DataCache::ToIntMsgDa(kSource, 65, u"SKCP:     Unable to connect to socket!");

@@ -43,6 +43,12 @@ AutoAnswer::AutoAnswer(QStringList answers) : m_answers(std::move(answers))
 void AutoAnswer::Poll()
 {
     QWidget *modal = QApplication::activeModalWidget();
+    // A window must stay the active modal one for a whole poll: a dialog is
+    // that for a moment between a box closing and the dialog itself closing.
+    if (modal != m_candidate) {
+        m_candidate = modal;
+        return;
+    }
     if (modal == m_last)
         return;
     m_last = modal;

@@ -35,6 +35,7 @@ private:
 
     QStringList m_answers;
     QTimer m_timer;
+    QPointer<QWidget> m_candidate;
     QPointer<QWidget> m_last;
     int m_unanswered = 0;
     int m_answered = 0;

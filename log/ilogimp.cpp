@@ -10,6 +10,7 @@
 #include <utility>
 
 #include <fcntl.h>
+#include <sys/stat.h>
 #include <sys/file.h>
 #include <sys/uio.h>
 #include <unistd.h>
@@ -278,9 +279,13 @@ ILogOut ILogImp::StartLine(const char *sourceFile, int line, LineKind kind, std:
 
 bool ILogImp::OpenFileLocked()
 {
-    const int fd = ::open(FilePath(m_fileName).c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0666);
+    // A log tells what was asked of whom: for its owner's eyes only.
+    const int fd = ::open(FilePath(m_fileName).c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600);
     if (fd < 0)
         return false;
+    struct stat status = {};
+    if (::fstat(fd, &status) == 0 && status.st_uid == ::geteuid() && (status.st_mode & 077))
+        ::fchmod(fd, status.st_mode & 0700);
     // Stands in for a share mode that lets others read but not write.
     const off_t end = ::flock(fd, LOCK_EX | LOCK_NB) == 0 ? ::lseek(fd, 0, SEEK_END) : -1;
     if (end < 0) {

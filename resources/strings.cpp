@@ -121,6 +121,8 @@ constexpr Entry kTable[] = {
     {Str::FolderAlreadyExcluded,
      QT_TRANSLATE_NOOP("ServerDialogs", "The folder with the path %1s has already been excluded from the search areas.")},
     {Str::ExploreError, QT_TRANSLATE_NOOP("ServerDialogs", "Opening the folder in Explorer has caused an error.")},
+    {Str::FolderOutsideSearchArea,
+     QT_TRANSLATE_NOOP("ServerDialogs", "The folder %1s does not lie in the search area %2s.")},
 };
 
 static_assert(std::size(kTable) == std::size_t(Str::Count), "every Str has exactly one row");

@@ -85,6 +85,7 @@ enum class Str
     CannotExcludeSearchArea,
     FolderAlreadyExcluded,
     ExploreError,
+    FolderOutsideSearchArea,
 
     Count
 };

@@ -23,6 +23,10 @@ inline constexpr std::uint32_t kResultFrameTooLarge = 0x8DF5E004u;  // a record 
 inline constexpr std::uint32_t kResultInvalidArgument = 0x8DF5E005u;
 inline constexpr std::uint32_t kResultUnreachable = 0x8DF5E006u; // nobody listens for the service
 inline constexpr std::uint32_t kResultUnknownHost = 0x8DF5E007u; // the server name did not resolve
+// The local server's socket, or a folder above it, is not this user's or
+// root's, or others may change it: somebody else may be standing in for the
+// server. rovoCommGetLastErrorText says which.
+inline constexpr std::uint32_t kResultUntrusted = 0x8DF5E008u;
 
 // The largest record either side sends or accepts. A peer announcing more is
 // refused before anything is allocated, and the connection is dropped.
@@ -65,9 +69,16 @@ extern "C" SORVIK_EXPORT std::int32_t NewClientSocket(const cv::krn::WString &se
                                                       const cv::krn::WString &serviceClass,
                                                       cv::vek::rovo::comm::ClientSocket **socket);
 
+// A readable description of the last failure of NewClientSocket on the
+// calling thread, empty when it has none to give; not an entry point a
+// caller must find.
+extern "C" SORVIK_EXPORT void rovoCommGetLastErrorText(cv::krn::WString *text);
+
 namespace cv::vek::rovo::comm {
 
 using NewClientSocketFunction = decltype(&::NewClientSocket);
 inline constexpr const char *kNewClientSocketExport = "NewClientSocket";
+using GetLastErrorTextFunction = decltype(&::rovoCommGetLastErrorText);
+inline constexpr const char *kGetLastErrorTextExport = "rovoCommGetLastErrorText";
 
 } // namespace cv::vek::rovo::comm

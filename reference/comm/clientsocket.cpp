@@ -1,11 +1,16 @@
 // The comm library's export: NewClientSocket and the ClientSocket it hands out.
 
+#include "krn/osdep/runtimefolder.h"
+#include "krn/utf.h"
 #include "reference/comm/connector.h"
 #include "reference/comm/endpoint.h"
 #include "reference/comm/framedsocket.h"
+#include "reference/comm/peertrust.h"
 #include "sorvik/rovocomm.h"
 
+#include <filesystem>
 #include <new>
+#include <string>
 
 #include <unistd.h>
 
@@ -59,6 +64,35 @@ std::int32_t AsStatus(std::uint32_t result)
     return static_cast<std::int32_t>(result);
 }
 
+thread_local std::string t_lastError;
+
+// A local connection that failed may have failed because the folders are
+// somebody else's: that is worth saying instead of "nobody listens".
+std::uint32_t ExplainLocalFailure(const Endpoint &endpoint, std::uint32_t result)
+{
+    const auto *local = std::get_if<UnixEndpoint>(&endpoint);
+    if (!local)
+        return result;
+    const std::filesystem::path serviceFolder = local->path.parent_path();
+    for (const auto &folder : {serviceFolder.parent_path(), serviceFolder}) {
+        std::error_code missing;
+        if (!std::filesystem::exists(std::filesystem::symlink_status(folder, missing)))
+            break;
+        const std::string reason = krn::osdep::UntrustedReason(folder);
+        if (!reason.empty()) {
+            t_lastError = "refused the local server at \"" + local->path.string() + "\": " + reason;
+            return kResultUntrusted;
+        }
+    }
+    return result;
+}
+
+std::uint32_t CheckConnected(const Endpoint &endpoint, int fd)
+{
+    const auto *local = std::get_if<UnixEndpoint>(&endpoint);
+    return local ? CheckLocalServer(local->path, fd, t_lastError) : kResultOk;
+}
+
 } // namespace
 
 } // namespace cv::vek::rovo::comm
@@ -74,6 +108,7 @@ extern "C" SORVIK_EXPORT std::int32_t NewClientSocket(const cv::krn::WString &se
     *socket = nullptr;
     // Nothing may leave through a C entry point.
     try {
+        t_lastError.clear();
         Endpoint endpoint;
         std::uint32_t result = ResolveEndpoint(server.view(), serviceName.view(), serviceClass.view(), endpoint);
         if (result != kResultOk)
@@ -81,7 +116,12 @@ extern "C" SORVIK_EXPORT std::int32_t NewClientSocket(const cv::krn::WString &se
         int fd = -1;
         result = ConnectEndpoint(endpoint, fd);
         if (result != kResultOk)
+            return AsStatus(ExplainLocalFailure(endpoint, result));
+        result = CheckConnected(endpoint, fd);
+        if (result != kResultOk) {
+            ::close(fd);
             return AsStatus(result);
+        }
         auto *made = new (std::nothrow) CommClientSocket(fd);
         if (!made) {
             ::close(fd);
@@ -91,5 +131,15 @@ extern "C" SORVIK_EXPORT std::int32_t NewClientSocket(const cv::krn::WString &se
         return 0;
     } catch (...) {
         return AsStatus(kResultFailure);
+    }
+}
+
+extern "C" SORVIK_EXPORT void rovoCommGetLastErrorText(cv::krn::WString *text)
+{
+    if (!text)
+        return;
+    try {
+        *text = cv::krn::WString(cv::krn::ToUtf16(cv::vek::rovo::comm::t_lastError));
+    } catch (...) {
     }
 }

@@ -4,6 +4,8 @@
 #include "sorvik/rovocomm.h"
 
 #include <cerrno>
+#include <charconv>
+#include <cstdlib>
 #include <cstring>
 #include <ctime>
 #include <memory>
@@ -42,6 +44,7 @@ std::uint32_t ConnectUnix(const UnixEndpoint &endpoint, int &fd)
         return kResultInvalidArgument;
     std::memcpy(address.sun_path, path.c_str(), path.size() + 1);
 
+    const auto wait = LocalConnectWait();
     const auto start = std::chrono::steady_clock::now();
     for (;;) {
         const int candidate = ::socket(AF_UNIX, SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC, 0);
@@ -55,7 +58,7 @@ std::uint32_t ConnectUnix(const UnixEndpoint &endpoint, int &fd)
         ::close(candidate);
         if (!ShouldRetryLocal(error))
             return error == EACCES || error == ENOTDIR ? kResultUnreachable : kResultFailure;
-        if (std::chrono::steady_clock::now() - start + kLocalRetryInterval > kLocalWait)
+        if (std::chrono::steady_clock::now() - start + kLocalRetryInterval > wait)
             return kResultUnreachable;
         PauseFor(kLocalRetryInterval);
     }
@@ -112,6 +115,19 @@ std::uint32_t ConnectTcp(const TcpEndpoint &endpoint, int &fd)
 }
 
 } // namespace
+
+std::chrono::milliseconds LocalConnectWait()
+{
+    const char *text = std::getenv("CORVANE_COMM_CONNECT_WAIT_MS");
+    if (!text || !*text)
+        return kLocalWait;
+    const char *end = text + std::strlen(text);
+    std::uint32_t milliseconds = 0;
+    const auto [stop, error] = std::from_chars(text, end, milliseconds);
+    if (error != std::errc() || stop != end || std::chrono::milliseconds(milliseconds) > kLocalWaitLimit)
+        return kLocalWait;
+    return std::chrono::milliseconds(milliseconds);
+}
 
 std::uint32_t ConnectEndpoint(const Endpoint &endpoint, int &fd)
 {

@@ -1,12 +1,12 @@
 #include "reference/comm/endpoint.h"
 
 #include "krn/osdep/registry.h"
+#include "krn/osdep/runtimefolder.h"
 #include "krn/utf.h"
 #include "sorvik/rovocomm.h"
 
 #include <arpa/inet.h>
 #include <climits>
-#include <cstdlib>
 #include <netinet/in.h>
 #include <sys/un.h>
 #include <unistd.h>
@@ -84,8 +84,7 @@ bool ParsePort(std::u16string_view text, std::uint16_t &port)
 
 std::filesystem::path RuntimeDirectory()
 {
-    const char *value = std::getenv("CORVANE_RUNTIME_DIR");
-    return (value && *value) ? std::filesystem::path(value) : std::filesystem::path("/tmp/corvane-run");
+    return krn::osdep::RuntimeDirectory();
 }
 
 bool IsThisMachine(std::u16string_view server)

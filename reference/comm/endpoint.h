@@ -31,7 +31,8 @@ using Endpoint = std::variant<UnixEndpoint, TcpEndpoint>;
 inline constexpr std::uint16_t kDefaultTcpPort = 17320;
 inline constexpr std::u16string_view kServicesKey = u"Software\\Corvane\\Common\\Sorvik\\Services";
 
-// $CORVANE_RUNTIME_DIR, else /tmp/corvane-run; read on every call.
+// $CORVANE_RUNTIME_DIR, else $XDG_RUNTIME_DIR/corvane, else
+// /tmp/corvane-run-<uid>; read on every call (cv::krn::osdep::RuntimeDirectory).
 std::filesystem::path RuntimeDirectory();
 
 bool IsThisMachine(std::u16string_view server);

@@ -11,6 +11,8 @@
 #include <sys/uio.h>
 #include <unistd.h>
 
+#include <utility>
+
 namespace cv::vek::rovo::comm {
 
 namespace {
@@ -64,6 +66,8 @@ void FramedSocket::Close() noexcept
     m_payloadBytes = 0;
     m_frameSize = 0;
     m_payload = krn::ByteBuffer();
+    m_readAheadBegin = 0;
+    m_readAheadEnd = 0;
 }
 
 std::uint32_t FramedSocket::Fail(std::uint32_t result) noexcept
@@ -129,7 +133,50 @@ std::uint32_t FramedSocket::Send(std::span<const std::uint8_t> record, std::uint
             next->iov_len -= left;
         }
     }
+    m_sentLast = true;
     return kResultOk;
+}
+
+bool FramedSocket::FrameComplete() const noexcept
+{
+    return m_headerBytes == sizeof m_header && m_payloadBytes == m_frameSize;
+}
+
+void FramedSocket::GrowPayloadIfFull()
+{
+    if (m_payload.size() == m_payloadBytes) {
+        const std::size_t grown = std::max(kFirstChunk, m_payloadBytes * 2);
+        m_payload.resize(std::min<std::size_t>(m_frameSize, grown));
+    }
+}
+
+bool FramedSocket::TakeReadAhead()
+{
+    while (m_readAheadBegin < m_readAheadEnd && !FrameComplete()) {
+        const std::uint8_t *from = m_readAhead + m_readAheadBegin;
+        const std::size_t available = m_readAheadEnd - m_readAheadBegin;
+        if (m_headerBytes < sizeof m_header) {
+            const std::size_t taken = std::min(sizeof m_header - m_headerBytes, available);
+            std::copy_n(from, taken, m_header + m_headerBytes);
+            m_headerBytes += taken;
+            m_readAheadBegin += taken;
+            if (m_headerBytes == sizeof m_header) {
+                m_frameSize = std::uint32_t(m_header[0]) | std::uint32_t(m_header[1]) << 8
+                    | std::uint32_t(m_header[2]) << 16 | std::uint32_t(m_header[3]) << 24;
+                if (m_frameSize > kMaxFrameBytes)
+                    return false;
+                m_payloadBytes = 0;
+                m_payload.clear();
+            }
+            continue;
+        }
+        GrowPayloadIfFull();
+        const std::size_t taken = std::min(m_payload.size() - m_payloadBytes, available);
+        std::copy_n(from, taken, m_payload.data() + m_payloadBytes);
+        m_payloadBytes += taken;
+        m_readAheadBegin += taken;
+    }
+    return true;
 }
 
 std::uint32_t FramedSocket::Receive(krn::ByteBuffer &record, std::uint32_t timeoutMs)
@@ -138,9 +185,22 @@ std::uint32_t FramedSocket::Receive(krn::ByteBuffer &record, std::uint32_t timeo
         return kResultConnectionLost;
 
     const Deadline deadline(timeoutMs);
+    // Right after a send a caller that may wait usually waits for the answer:
+    // waiting first saves the read that would only find nothing.
+    bool waitFirst = std::exchange(m_sentLast, false) && timeoutMs != 0 && m_headerBytes == 0
+        && m_readAheadBegin == m_readAheadEnd;
     for (;;) {
-        const bool inHeader = m_headerBytes < sizeof m_header;
-        if (!inHeader && m_payloadBytes == m_frameSize) {
+        if (waitFirst) {
+            waitFirst = false;
+            const Wait wait = WaitFor(m_fd, POLLIN, deadline);
+            if (wait == Wait::Failed)
+                return FailWithErrno(errno);
+            if (wait == Wait::TimedOut)
+                return kResultTimeout;
+        }
+        if (!TakeReadAhead())
+            return Fail(kResultFrameTooLarge);
+        if (FrameComplete()) {
             m_payload.resize(m_frameSize);
             record = std::move(m_payload);
             m_payload = krn::ByteBuffer();
@@ -150,16 +210,13 @@ std::uint32_t FramedSocket::Receive(krn::ByteBuffer &record, std::uint32_t timeo
             return kResultOk;
         }
 
-        std::uint8_t *target;
-        std::size_t wanted;
-        if (inHeader) {
-            target = m_header + m_headerBytes;
-            wanted = sizeof m_header - m_headerBytes;
-        } else {
-            if (m_payload.size() == m_payloadBytes) {
-                const std::size_t grown = std::max(kFirstChunk, m_payloadBytes * 2);
-                m_payload.resize(std::min<std::size_t>(m_frameSize, grown));
-            }
+        // The read-ahead is empty here. A large rest of a payload goes
+        // straight to its place; anything else through the read-ahead.
+        std::uint8_t *target = m_readAhead;
+        std::size_t wanted = kReadAheadBytes;
+        const bool direct = m_headerBytes == sizeof m_header && m_frameSize - m_payloadBytes > kReadAheadBytes;
+        if (direct) {
+            GrowPayloadIfFull();
             target = m_payload.data() + m_payloadBytes;
             wanted = m_payload.size() - m_payloadBytes;
         }
@@ -180,19 +237,11 @@ std::uint32_t FramedSocket::Receive(krn::ByteBuffer &record, std::uint32_t timeo
                 return kResultTimeout;
             continue;
         }
-
-        if (inHeader) {
-            m_headerBytes += static_cast<std::size_t>(got);
-            if (m_headerBytes == sizeof m_header) {
-                m_frameSize = std::uint32_t(m_header[0]) | std::uint32_t(m_header[1]) << 8
-                    | std::uint32_t(m_header[2]) << 16 | std::uint32_t(m_header[3]) << 24;
-                if (m_frameSize > kMaxFrameBytes)
-                    return Fail(kResultFrameTooLarge);
-                m_payloadBytes = 0;
-                m_payload.clear();
-            }
-        } else {
+        if (direct) {
             m_payloadBytes += static_cast<std::size_t>(got);
+        } else {
+            m_readAheadBegin = 0;
+            m_readAheadEnd = static_cast<std::size_t>(got);
         }
     }
 }

@@ -42,6 +42,11 @@ public:
 private:
     std::uint32_t Fail(std::uint32_t result) noexcept;
     std::uint32_t FailWithErrno(int error) noexcept;
+    // Moves read-ahead bytes into the frame being received; false when its
+    // header announces more than kMaxFrameBytes.
+    bool TakeReadAhead();
+    bool FrameComplete() const noexcept;
+    void GrowPayloadIfFull();
 
     int m_fd;
     // The frame being received.
@@ -50,6 +55,14 @@ private:
     std::uint32_t m_frameSize = 0;
     std::size_t m_payloadBytes = 0;
     krn::ByteBuffer m_payload;
+    // Bytes read beyond what the frame needed so far: one read brings a small
+    // record's header and payload (and maybe the start of the next) at once.
+    static constexpr std::size_t kReadAheadBytes = 4096;
+    std::uint8_t m_readAhead[kReadAheadBytes];
+    std::size_t m_readAheadBegin = 0;
+    std::size_t m_readAheadEnd = 0;
+    // The last operation was a send: the answer to it is rarely there yet.
+    bool m_sentLast = false;
 };
 
 } // namespace cv::vek::rovo::comm

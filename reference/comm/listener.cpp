@@ -1,5 +1,6 @@
 #include "reference/comm/listener.h"
 
+#include "krn/osdep/runtimefolder.h"
 #include "reference/comm/deadline.h"
 #include "reference/comm/endpoint.h"
 #include "sorvik/rovocomm.h"
@@ -27,22 +28,13 @@ constexpr int kBacklog = 64;
     throw std::system_error(error, std::generic_category(), what);
 }
 
-// The runtime folder is shared by every user, like /tmp; the folder of a
-// service class belongs to whoever made it first. Neither may be a link,
-// which would lead the socket elsewhere.
-void EnsureFolder(const std::filesystem::path &folder, mode_t mode, bool shared)
+// A folder that another user may change would let that user put a socket
+// of theirs in the server's place.
+void EnsureFolder(const std::filesystem::path &folder)
 {
-    if (::mkdir(folder.c_str(), mode) == 0) {
-        if (shared && ::chmod(folder.c_str(), mode) != 0)
-            ThrowErrno(errno, "chmod");
-    } else if (errno != EEXIST) {
-        ThrowErrno(errno, "mkdir");
-    }
-    struct stat status = {};
-    if (::lstat(folder.c_str(), &status) != 0)
-        ThrowErrno(errno, "lstat");
-    if (!S_ISDIR(status.st_mode))
-        ThrowErrno(ENOTDIR, "runtime folder");
+    const std::string reason = krn::osdep::EnsureTrustedFolder(folder);
+    if (!reason.empty())
+        throw std::system_error(EACCES, std::generic_category(), "socket folder " + reason);
 }
 
 sockaddr_un UnixAddress(const std::filesystem::path &path)
@@ -86,8 +78,8 @@ void Listener::ListenLocal(std::u16string_view serviceName, std::u16string_view 
     std::filesystem::path path;
     if (LocalSocketPath(serviceName, serviceClass, path) != kResultOk)
         ThrowErrno(EINVAL, "service name or class");
-    EnsureFolder(path.parent_path().parent_path(), 01777, true);
-    EnsureFolder(path.parent_path(), 0755, false);
+    EnsureFolder(path.parent_path().parent_path());
+    EnsureFolder(path.parent_path());
     ListenUnix(path);
 }
 

@@ -28,7 +28,9 @@ public:
     Listener(const Listener &) = delete;
     Listener &operator=(const Listener &) = delete;
 
-    // Listens at RuntimeDirectory()/<class>/<name>.sock, creating the folders.
+    // Listens at RuntimeDirectory()/<class>/<name>.sock, creating the folders
+    // for this user alone. A folder that is not this user's or root's, or
+    // that other users may change, raises std::system_error (EACCES).
     // A socket file that nobody listens on any more is replaced; one that
     // another process still serves raises std::system_error (EADDRINUSE).
     void ListenLocal(std::u16string_view serviceName, std::u16string_view serviceClass);

@@ -2,6 +2,7 @@
 
 #include "reference/comm/deadline.h"
 #include "reference/comm/endpoint.h"
+#include "reference/comm/peertrust.h"
 #include "reference/managerchannel/managermessage.h"
 #include "reference/managerchannel/managerprotocol.h"
 
@@ -57,6 +58,13 @@ std::unique_ptr<ManagerConnection> ManagerConnection::Open(std::u16string_view p
     } while (result != 0 && errno == EINTR);
     if (result != 0) {
         error = errno == EINPROGRESS ? EAGAIN : errno;
+        ::close(fd);
+        return nullptr;
+    }
+    // A socket another user could have put there is nobody's to trust.
+    std::string untrusted;
+    if (comm::CheckLocalServer(path, fd, untrusted) != comm::kResultOk) {
+        error = EACCES;
         ::close(fd);
         return nullptr;
     }

@@ -2,6 +2,7 @@
 
 #include "reference/rovoapi/catalogueinfo.h"
 #include "reference/rovoapi/config.h"
+#include "reference/rovoapi/configanswers.h"
 #include "reference/rovoapi/connection.h"
 #include "reference/rovoapi/indexmanager.h"
 #include "reference/rovoapi/skc.h"
@@ -13,6 +14,7 @@
 
 #include <functional>
 #include <mutex>
+#include <optional>
 #include <vector>
 
 namespace sorvik::rovo {
@@ -79,6 +81,9 @@ StartState &Started()
     return state;
 }
 
+class Editor;
+using Change = std::function<void(ConfigWriter &)>;
+
 // What the objects of one opened Sorvik share.
 class SorvikContext
 {
@@ -101,16 +106,32 @@ public:
         return [this] { return Catalogue(); };
     }
 
+    // The editor of this Sorvik object holding an import, whose configuration
+    // the views show until it is committed or gone.
+    void SetImporter(Editor *editor)
+    {
+        std::lock_guard guard(m_importLock);
+        m_importer = editor;
+    }
+    void ForgetImporter(Editor *editor)
+    {
+        std::lock_guard guard(m_importLock);
+        if (m_importer == editor)
+            m_importer = nullptr;
+    }
+    // Null when no import waits.
+    std::shared_ptr<const Configuration> ImportedConfiguration();
+
     const Connection connection;
     const QString storeFile;
 
 private:
+    std::mutex m_importLock; // guards m_importer, and keeps it alive while it is asked
+    Editor *m_importer = nullptr;
     std::mutex m_lock;
     RefPtr<cv::vekex::IEnvironment> m_dataStore;
     std::shared_ptr<const CatalogueInfo> m_catalogue;
 };
-
-using Change = std::function<void(ConfigWriter &)>;
 
 class Editor final : public ref::RefObject<cv::rovo::IConfigurationEditor>
 {
@@ -118,6 +139,30 @@ public:
     explicit Editor(std::shared_ptr<SorvikContext> context)
         : m_context(std::move(context)), m_db(OpenStore(m_context->storeFile, false))
     {
+    }
+    ~Editor() override { m_context->ForgetImporter(this); }
+
+    // An import replaces the whole configuration; the views of this Sorvik
+    // show it from now on, with the changes recorded after it.
+    void RecordImport(Change change)
+    {
+        Record(std::move(change));
+        m_context->SetImporter(this);
+    }
+
+    // State(), kept while nothing new is recorded.
+    std::shared_ptr<const Configuration> PendingState()
+    {
+        {
+            std::lock_guard guard(m_db->Lock());
+            if (m_pendingState && m_pendingChanges == m_changes.size())
+                return m_pendingState;
+        }
+        auto state = std::make_shared<const Configuration>(State());
+        std::lock_guard guard(m_db->Lock());
+        m_pendingState = state;
+        m_pendingChanges = m_changes.size();
+        return state;
     }
 
     const SorvikContext *Context() const { return m_context.get(); }
@@ -239,6 +284,8 @@ public:
             const std::int64_t generation = AdvanceConfigGeneration(*m_db);
             transaction.Commit();
             m_changes.clear();
+            m_pendingState.reset();
+            m_context->ForgetImporter(this);
             AnnounceCommit(m_context->storeFile, generation);
         });
     }
@@ -415,7 +462,15 @@ private:
     const std::shared_ptr<SorvikContext> m_context;
     const std::unique_ptr<Db> m_db;
     std::vector<Change> m_changes;
+    std::shared_ptr<const Configuration> m_pendingState;
+    std::size_t m_pendingChanges = 0;
 };
+
+std::shared_ptr<const Configuration> SorvikContext::ImportedConfiguration()
+{
+    std::lock_guard guard(m_importLock);
+    return m_importer ? m_importer->PendingState() : nullptr;
+}
 
 class View final : public ref::RefObject<cv::rovo::IConfigurationView>
 {
@@ -428,6 +483,8 @@ public:
     cv::vekex::IStringList *ListSearchAreas(std::int32_t *status) override
     {
         return Guard(status, [&]() -> cv::vekex::IStringList * {
+            if (const auto imported = Imported())
+                return Strings(imported->Answers().SearchAreas());
             std::lock_guard guard(m_db->Lock());
             Statement select(*m_db, "SELECT path FROM folders WHERE area_id IS NULL ORDER BY position, id");
             return Strings(select);
@@ -439,6 +496,10 @@ public:
         return Guard(status, [&]() -> cv::vekex::IStringList * {
             if (areaPath.empty())
                 return nullptr;
+            if (const auto imported = Imported()) {
+                const auto folders = imported->Answers().ExcludedFolders(LookupKey(areaPath));
+                return folders ? Strings(*folders) : nullptr;
+            }
             std::lock_guard guard(m_db->Lock());
             Transaction read(*m_db, Transaction::Kind::Read, status::StoreUnavailable);
             Statement area(*m_db, "SELECT id FROM folders WHERE path_key = ? AND area_id IS NULL");
@@ -459,6 +520,15 @@ public:
             Required(alias, u"the alias out-argument");
             if (flags != 0)
                 Bad(status::InvalidArgument, QStringLiteral("GetSearchArea takes the flags 0, not %1").arg(flags));
+            if (const auto imported = Imported()) {
+                const Folder *folder = imported->Answers().FindFolder(LookupKey(path));
+                if (!folder)
+                    Bad(status::NotFound,
+                        QStringLiteral("%1 is neither a search area nor an excluded folder").arg(ToQString(path)));
+                *clientPath = FromQString(folder->clientPath);
+                *alias = FromQString(folder->alias);
+                return;
+            }
             std::lock_guard guard(m_db->Lock());
             Statement select(*m_db, "SELECT client_path, alias FROM folders WHERE path_key = ?");
             select.Bind(1, LookupKey(path));
@@ -471,13 +541,20 @@ public:
 
     bool IsSearchArea(const WString &path, std::int32_t *status) override
     {
-        return Guard(status, [&] { return Exists(path, "SELECT 1 FROM folders WHERE path_key = ? AND area_id IS NULL"); });
+        return Guard(status, [&] {
+            if (const auto imported = Imported())
+                return !path.empty() && imported->Answers().IsSearchArea(LookupKey(path));
+            return Exists(path, "SELECT 1 FROM folders WHERE path_key = ? AND area_id IS NULL");
+        });
     }
 
     bool IsExcludedFolder(const WString &path, std::int32_t *status) override
     {
-        return Guard(status,
-                     [&] { return Exists(path, "SELECT 1 FROM folders WHERE path_key = ? AND area_id IS NOT NULL"); });
+        return Guard(status, [&] {
+            if (const auto imported = Imported())
+                return !path.empty() && imported->Answers().IsExcludedFolder(LookupKey(path));
+            return Exists(path, "SELECT 1 FROM folders WHERE path_key = ? AND area_id IS NOT NULL");
+        });
     }
 
     void ImportConfiguration(const WString &file, cv::rovo::IConfigurationEditor *editor, std::int32_t *status) override
@@ -485,7 +562,7 @@ public:
         Guard(status, [&] {
             Editor &target = OwnEditor(Required(editor, u"the editor"));
             Configuration configuration = ReadConfigurationFile(ToQString(file), *m_context->Catalogue());
-            target.Record([configuration](ConfigWriter &writer) { writer.Replace(configuration); });
+            target.RecordImport([configuration](ConfigWriter &writer) { writer.Replace(configuration); });
         });
     }
 
@@ -550,6 +627,8 @@ public:
     {
         return Guard(status, [&]() -> std::int32_t {
             const ParseletInfo &parselet = m_context->Catalogue()->Require(ToQString(name), status::NotFound);
+            if (const auto imported = Imported())
+                return imported->Answers().IsActive(parselet) ? 1 : 0;
             std::lock_guard guard(m_db->Lock());
             return Active(parselet) ? 1 : 0;
         });
@@ -559,6 +638,8 @@ public:
     {
         return Guard(status, [&]() -> cv::vekex::IStringList * {
             const QString key = Key(ToQString(extension));
+            if (const auto imported = Imported())
+                return Strings(imported->Answers().ExtensionParselets(key));
             const auto catalogue = m_context->Catalogue();
             std::lock_guard guard(m_db->Lock());
             Transaction read(*m_db, Transaction::Kind::Read, status::StoreUnavailable);
@@ -604,8 +685,33 @@ private:
 
     Settings Current()
     {
+        if (const auto imported = Imported())
+            return imported->Answers().CurrentSettings();
         std::lock_guard guard(m_db->Lock());
         return ReadSettings(*m_db);
+    }
+
+    // What an import waiting in an editor of this Sorvik holds.
+    struct ImportedState
+    {
+        std::shared_ptr<const Configuration> configuration;
+        std::shared_ptr<const CatalogueInfo> catalogue;
+        ConfigAnswers Answers() const { return ConfigAnswers(*configuration, *catalogue); }
+    };
+    std::optional<ImportedState> Imported()
+    {
+        std::shared_ptr<const Configuration> configuration = m_context->ImportedConfiguration();
+        if (!configuration)
+            return std::nullopt;
+        return ImportedState{std::move(configuration), m_context->Catalogue()};
+    }
+
+    static cv::vekex::IStringList *Strings(const std::vector<QString> &texts)
+    {
+        std::vector<WString> items;
+        for (const QString &text : texts)
+            items.push_back(FromQString(text));
+        return new ref::StringList(std::move(items));
     }
 
     // With the connection locked.

@@ -286,31 +286,8 @@ void WriteFolder(QXmlStreamWriter &xml, const Folder &folder)
     xml.writeAttribute(QStringLiteral("tag"), folder.tag);
 }
 
-} // namespace
-
-Configuration ReadConfigurationFile(const QString &file, const CatalogueInfo &catalogue)
+void WriteConfiguration(QXmlStreamWriter &xml, const Configuration &configuration)
 {
-    QFile input(file);
-    if (!input.open(QIODevice::ReadOnly))
-        ref::Fail(status::FileUnreadable,
-                  QStringLiteral("%1 cannot be read: %2").arg(file, input.errorString()).toStdU16String());
-    if (input.size() > kMaxFileBytes)
-        ref::Fail(status::FileMalformed,
-                  QStringLiteral("%1 is larger than %2 bytes").arg(file).arg(kMaxFileBytes).toStdU16String());
-    const QByteArray bytes = input.read(kMaxFileBytes + 1);
-    if (input.error() != QFileDevice::NoError)
-        ref::Fail(status::FileUnreadable,
-                  QStringLiteral("%1 cannot be read: %2").arg(file, input.errorString()).toStdU16String());
-    return Reader(file, bytes, catalogue).Read();
-}
-
-void WriteConfigurationFile(const QString &file, const Configuration &configuration)
-{
-    QSaveFile output(file);
-    if (!output.open(QIODevice::WriteOnly))
-        ref::Fail(status::FileWriteFailed,
-                  QStringLiteral("%1 cannot be written: %2").arg(file, output.errorString()).toStdU16String());
-    QXmlStreamWriter xml(&output);
     xml.setAutoFormatting(true);
     xml.writeStartDocument();
     xml.writeStartElement(QStringLiteral("sorvikconfiguration"));
@@ -370,9 +347,57 @@ void WriteConfigurationFile(const QString &file, const Configuration &configurat
 
     xml.writeEndElement();
     xml.writeEndDocument();
-    if (xml.hasError() || !output.commit())
+}
+
+} // namespace
+
+Configuration ReadConfigurationFile(const QString &file, const CatalogueInfo &catalogue)
+{
+    QFile input(file);
+    if (!input.open(QIODevice::ReadOnly))
+        ref::Fail(status::FileUnreadable,
+                  QStringLiteral("%1 cannot be read: %2").arg(file, input.errorString()).toStdU16String());
+    if (input.size() > kMaxFileBytes)
+        ref::Fail(status::FileMalformed,
+                  QStringLiteral("%1 is larger than %2 bytes").arg(file).arg(kMaxFileBytes).toStdU16String());
+    const QByteArray bytes = input.read(kMaxFileBytes + 1);
+    if (input.error() != QFileDevice::NoError)
+        ref::Fail(status::FileUnreadable,
+                  QStringLiteral("%1 cannot be read: %2").arg(file, input.errorString()).toStdU16String());
+    return ParseConfiguration(file, bytes, catalogue);
+}
+
+Configuration ParseConfiguration(const QString &file, const QByteArray &bytes, const CatalogueInfo &catalogue)
+{
+    if (bytes.size() > kMaxFileBytes)
+        ref::Fail(status::FileMalformed,
+                  QStringLiteral("%1 is larger than %2 bytes").arg(file).arg(kMaxFileBytes).toStdU16String());
+    return Reader(file, bytes, catalogue).Read();
+}
+
+QByteArray SerializeConfiguration(const Configuration &configuration)
+{
+    QByteArray bytes;
+    QXmlStreamWriter xml(&bytes);
+    WriteConfiguration(xml, configuration);
+    return bytes;
+}
+
+void WriteConfigurationFile(const QString &file, const Configuration &configuration)
+{
+    const QByteArray bytes = SerializeConfiguration(configuration);
+    // Unbuffered, so that a write cut short (a full disk) shows in its count:
+    // through the buffer it went unnoticed and half a file replaced the old.
+    QSaveFile output(file);
+    const bool written = output.open(QIODevice::WriteOnly | QIODevice::Unbuffered)
+        && output.write(bytes) == bytes.size();
+    const QString error = output.errorString();
+    if (!written)
+        output.cancelWriting();
+    if (!written || !output.commit())
         ref::Fail(status::FileWriteFailed,
-                  QStringLiteral("%1 cannot be written: %2").arg(file, output.errorString()).toStdU16String());
+                  QStringLiteral("%1 cannot be written: %2").arg(file, written ? output.errorString() : error)
+                      .toStdU16String());
 }
 
 } // namespace sorvik::rovo

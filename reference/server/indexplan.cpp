@@ -1,32 +1,12 @@
 #include "reference/server/indexplan.h"
 
+#include "reference/rovoapi/configanswers.h"
+
 #include <QFile>
 
 #include <algorithm>
 
 namespace sorvik::server {
-
-namespace {
-
-bool Active(const rovo::Configuration &configuration, const rovo::ParseletInfo &parselet)
-{
-    for (const rovo::ParseletSetting &setting : configuration.parselets) {
-        if (setting.name.compare(parselet.name, Qt::CaseInsensitive) == 0)
-            return setting.active;
-    }
-    return parselet.ActiveByDefault();
-}
-
-std::vector<QString> ExplicitOrder(const rovo::Configuration &configuration, const QString &extensionKey)
-{
-    for (const rovo::ExtensionPriority &priority : configuration.priorities) {
-        if (rovo::Key(priority.extension) == extensionKey)
-            return priority.parselets;
-    }
-    return {};
-}
-
-} // namespace
 
 std::string ExtensionKey(std::string_view fileName)
 {
@@ -85,16 +65,15 @@ IndexPlan MakePlan(const rovo::Configuration &configuration, const rovo::Catalog
             planned.excludedKeys.push_back(rovo::Key(excluded.path));
         plan.areas.push_back(std::move(planned));
     }
+    const rovo::ConfigAnswers answers(configuration, catalogue);
     for (const rovo::ParseletInfo &parselet : catalogue.parselets) {
         for (const QString &extension : parselet.extensions) {
             const std::string key = extension.toStdString();
             if (plan.parselets.count(key))
                 continue;
-            const auto readers = rovo::ExtensionParselets(
-                catalogue, extension, ExplicitOrder(configuration, extension),
-                [&configuration](const rovo::ParseletInfo &p) { return Active(configuration, p); });
+            const std::vector<QString> readers = answers.ExtensionParselets(extension);
             if (!readers.empty())
-                plan.parselets.emplace(key, readers.front()->name.toStdString());
+                plan.parselets.emplace(key, readers.front().toStdString());
         }
     }
     return plan;

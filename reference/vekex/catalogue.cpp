@@ -172,16 +172,19 @@ private:
     QByteArray ReadIcon(const QString &iconFile, const QString &parselet)
     {
         const QString path = QFileInfo(m_path).absoluteDir().absoluteFilePath(iconFile);
+        // A device or pipe would report size 0 and never end.
+        if (!QFileInfo(path).isFile())
+            Unreadable(QStringLiteral("%1: the icon %2 of the Parselet \"%3\" is not a file").arg(m_path, path, parselet));
         QFile file(path);
         if (!file.open(QIODevice::ReadOnly))
             Unreadable(QStringLiteral("%1: the icon %2 of the Parselet \"%3\" cannot be read: %4")
                            .arg(m_path, path, parselet, file.errorString()));
-        if (file.size() > kMaxIconBytes)
+        QByteArray bytes = file.read(kMaxIconBytes + 1);
+        if (bytes.size() > kMaxIconBytes)
             Unreadable(QStringLiteral("%1: the icon %2 of the Parselet \"%3\" is larger than %4 bytes")
                            .arg(m_path, path, parselet)
                            .arg(kMaxIconBytes));
-        QByteArray bytes = file.readAll();
-        if (bytes.size() != file.size())
+        if (file.error() != QFileDevice::NoError || bytes.size() != file.size())
             Unreadable(QStringLiteral("%1: the icon %2 cannot be read in full").arg(m_path, path));
         return bytes;
     }
@@ -241,9 +244,16 @@ std::shared_ptr<const Catalogue> LoadCatalogue(const QString &path)
         Unreadable(QStringLiteral("the Parselet catalogue %1 cannot be read: %2").arg(path, file.errorString()));
     if (file.size() > kMaxCatalogueBytes)
         Unreadable(QStringLiteral("the Parselet catalogue %1 is larger than %2 bytes").arg(path).arg(kMaxCatalogueBytes));
-    const QByteArray bytes = file.readAll();
+    const QByteArray bytes = file.read(kMaxCatalogueBytes + 1);
     if (file.error() != QFileDevice::NoError)
         Unreadable(QStringLiteral("the Parselet catalogue %1 cannot be read: %2").arg(path, file.errorString()));
+    return ParseCatalogue(path, bytes);
+}
+
+std::shared_ptr<const Catalogue> ParseCatalogue(const QString &path, const QByteArray &bytes)
+{
+    if (bytes.size() > kMaxCatalogueBytes)
+        Unreadable(QStringLiteral("the Parselet catalogue %1 is larger than %2 bytes").arg(path).arg(kMaxCatalogueBytes));
     return Parser(path, bytes).Parse();
 }
 

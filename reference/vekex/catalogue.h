@@ -48,4 +48,7 @@ QString CataloguePath();
 // line and what is wrong.
 std::shared_ptr<const Catalogue> LoadCatalogue(const QString &path);
 
+// The same from bytes already read; icons are still read relative to path.
+std::shared_ptr<const Catalogue> ParseCatalogue(const QString &path, const QByteArray &bytes);
+
 } // namespace sorvik::vekex

@@ -74,7 +74,12 @@ INSTANTIATE_TEST_SUITE_P(
                       Gates{PackVersion(2, 0, 3), {4003, 4005, 4006, 4007, 4008}},
                       Gates{PackVersion(3, 1, 1), {4003, 4005, 4006, 4007, 4008, 4009}},
                       Gates{PackVersion(3, 2, 0), {4003, 4005, 4006, 4008, 4009}},
-                      Gates{PackVersion(18, 0, 0), {4003, 4005, 4006, 4008, 4009}}));
+                      Gates{PackVersion(18, 0, 0), {4003, 4005, 4006, 4008, 4009}}),
+    [](const ::testing::TestParamInfo<Gates> &info) {
+        const std::uint32_t version = info.param.version;
+        return "server_" + std::to_string(sorvik::VersionMajor(version)) + '_' +
+               std::to_string(sorvik::VersionMinor(version)) + '_' + std::to_string(sorvik::VersionPatch(version));
+    });
 
 TEST_F(DirectStoreAccessTest, RequestsCarryTheirArgumentWordAndIdentification)
 {
@@ -146,6 +151,7 @@ TEST_F(DirectStoreAccessTest, FailuresGiveTheFailureValuesAndNeverRaise)
 
 TEST_F(DirectStoreAccessTest, UnreachableInstanceGivesTheFailureValue)
 {
+    testsupport::ScopedEnv connectWindow("CORVANE_COMM_CONNECT_WAIT_MS", "0");
     AccessRef access{CreateDirectStoreAccess(u"Nobody", 0)};
     EXPECT_EQ(access->GetElementCount(8), kFailure);
 }

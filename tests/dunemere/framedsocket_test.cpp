@@ -14,6 +14,7 @@
 #include <chrono>
 #include <cstring>
 #include <fstream>
+#include <optional>
 #include <string>
 #include <fcntl.h>
 #include <sys/socket.h>
@@ -96,6 +97,23 @@ TEST_F(FramedPair, ReceivesOneRecordPerCall)
     EXPECT_EQ(Text(received), "");
     ASSERT_EQ(framed->Receive(received, 1000), kResultOk);
     EXPECT_EQ(Text(received), "third");
+    EXPECT_EQ(framed->Receive(received, 0), kResultTimeout);
+}
+
+TEST_F(FramedPair, RecordsAcrossEveryReadBoundaryArriveWhole)
+{
+    // Sizes around the socket's read-ahead put a header across the end of one
+    // read, and a large payload partly in the read-ahead, partly behind it.
+    const std::vector<std::size_t> sizes = {4090, 1, 4088, 100000, 0, 4096, 3, 5000};
+    std::string stream;
+    for (const std::size_t size : sizes)
+        stream += Frame(std::string(size, char('a' + size % 26)));
+    for (std::size_t at = 0; at < stream.size(); at += 60000)
+        Write(stream.substr(at, 60000));
+    for (const std::size_t size : sizes) {
+        ASSERT_EQ(framed->Receive(received, 1000), kResultOk) << size;
+        EXPECT_EQ(Text(received), std::string(size, char('a' + size % 26)));
+    }
     EXPECT_EQ(framed->Receive(received, 0), kResultTimeout);
 }
 
@@ -254,6 +272,31 @@ TEST_F(Resolution, AListenerTakesOverAStaleSocketButNotALiveOne)
     ::close(orphan);
     Listener second;
     EXPECT_NO_THROW(second.ListenLocal(u"N", u"C"));
+}
+
+TEST(LocalConnectWait, FiveSecondsUnlessTheSettingGivesAnotherWindow)
+{
+    using std::chrono::milliseconds;
+    const std::pair<std::optional<std::string>, milliseconds> rows[] = {
+        {std::nullopt, milliseconds(5000)}, {"", milliseconds(5000)},      {"250", milliseconds(250)},
+        {"0", milliseconds(0)},             {"60000", milliseconds(60000)}, {"60001", milliseconds(5000)},
+        {"-1", milliseconds(5000)},         {"2s", milliseconds(5000)},     {" 250", milliseconds(5000)},
+    };
+    for (const auto &[setting, window] : rows) {
+        testsupport::ScopedEnv env("CORVANE_COMM_CONNECT_WAIT_MS", setting);
+        EXPECT_EQ(LocalConnectWait(), window) << setting.value_or("(unset)");
+    }
+}
+
+TEST_F(Resolution, NobodyListeningLocallyIsTriedForTheWholeWindow)
+{
+    const Endpoint endpoint = Resolve(u"localhost", u"Nobody", u"C");
+    testsupport::ScopedEnv window("CORVANE_COMM_CONNECT_WAIT_MS", "300");
+    const auto started = std::chrono::steady_clock::now();
+    int fd = -1;
+    EXPECT_EQ(ConnectEndpoint(endpoint, fd), kResultUnreachable);
+    EXPECT_GE(std::chrono::steady_clock::now() - started, std::chrono::milliseconds(250));
+    EXPECT_EQ(fd, -1);
 }
 
 TEST(Tcp, CarriesRecordsBothWays)

@@ -10,12 +10,14 @@
 #include "dunemere/tointmsgda.h"
 #include "sorvik/packedversion.h"
 #include "support/scriptedserver.h"
+#include "support/signal.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include <chrono>
-#include <thread>
+#include <optional>
+#include <vector>
 
 namespace {
 
@@ -24,6 +26,8 @@ using cv::vek::rovo::tRequestTransferData;
 using cv::vek::rovo::tResponseTransferData;
 using sorvik::PackVersion;
 using testsupport::ScriptedServer;
+using testsupport::Signal;
+using namespace std::chrono_literals;
 using ::testing::HasSubstr;
 
 [[maybe_unused]] const bool g_registry = (testsupport::InstallCommRegistry(), true);
@@ -61,10 +65,13 @@ std::vector<ScriptedServer::Request> OfKind(const std::vector<ScriptedServer::Re
 class RequestorTest : public testsupport::ProtocolTest
 {
 protected:
-    std::uint32_t Ask(RequestorBase &requestor, std::uint32_t code = 4002)
+    // The log-on waits for answers as long as the settings say; the request
+    // itself waits receiveTimeout when given.
+    std::uint32_t Ask(RequestorBase &requestor, std::optional<std::uint32_t> receiveTimeout = {})
     {
-        tRequestTransferData request(m_config->GetServerVersion(), 5, code);
-        return tResponseTransferData(requestor.Exchange(m_config->GetReceiveTimeout(), request)).Value();
+        tRequestTransferData request(m_config->GetServerVersion(), 5, 4002);
+        return tResponseTransferData(requestor.Exchange(receiveTimeout.value_or(m_config->GetReceiveTimeout()), request))
+            .Value();
     }
 };
 
@@ -99,7 +106,10 @@ TEST_P(VersionNegotiation, SecondPermissionCarriesTheServersVersionAndLaterReque
 
 INSTANTIATE_TEST_SUITE_P(Servers, VersionNegotiation,
                          ::testing::Values(Negotiation{PackVersion(17, 0, 0), PackVersion(17, 0, 0)},
-                                           Negotiation{PackVersion(19, 0, 0), k18}));
+                                           Negotiation{PackVersion(19, 0, 0), k18}),
+                         [](const ::testing::TestParamInfo<Negotiation> &info) {
+                             return "server_" + std::to_string(sorvik::VersionMajor(info.param.server));
+                         });
 
 TEST_F(RequestorTest, ServerRefusingBothVersionsIsIncompatible)
 {
@@ -178,45 +188,103 @@ TEST_F(RequestorTest, ReceiveTimeoutRaises180AndLeavesNoConnection)
         if (request.category == 4)
             peer.Send(ScriptedServer::Data(request.id, 0));
     });
-    RequestorBase requestor(Settings(u"<receivetimeout>300</receivetimeout>"), m_log);
+    RequestorBase requestor(Settings(), m_log);
 
-    const auto started = std::chrono::steady_clock::now();
-    const auto error = ErrorOf([&] { Ask(requestor); });
+    const auto error = ErrorOf([&] { Ask(requestor, 300); });
     EXPECT_EQ(error.Code(), 180u);
     EXPECT_THAT(Utf8(error.Message()), HasSubstr("): SKCP:     Request timeout. No response."));
+    EXPECT_EQ(OfKind(server.Received(), 5, 4002).size(), 1u) << "logged on, and the request went out";
     EXPECT_FALSE(requestor.IsConnected());
-    EXPECT_LT(std::chrono::steady_clock::now() - started, std::chrono::seconds(5));
 }
 
 TEST_F(RequestorTest, AnswersToOtherRequestsCannotHoldTheClientPastItsTimeout)
 {
-    ScriptedServer server(u"P", [](const ScriptedServer::Request &request, ScriptedServer::Peer &peer) {
+    // The server answers other requests until the client gives up or, far
+    // past the client's time-out, the test ends it.
+    Signal clientGaveUp;
+    ScriptedServer server(u"P", [&](const ScriptedServer::Request &request, ScriptedServer::Peer &peer) {
         if (request.category == 4) {
             peer.Send(ScriptedServer::Data(request.id, 0));
             return;
         }
-        for (int i = 0; i < 40; ++i) {
+        const auto end = std::chrono::steady_clock::now() + 10s;
+        while (std::chrono::steady_clock::now() < end && !clientGaveUp.WaitFor(20ms))
             peer.Send(ScriptedServer::Data(cv::vek::rovo::NewRequestIdentifier(), 0, 1));
-            std::this_thread::sleep_for(std::chrono::milliseconds(25));
+    });
+    RequestorBase requestor(Settings(), m_log);
+
+    constexpr std::uint32_t timeout = 300;
+    const auto started = std::chrono::steady_clock::now();
+    const auto error = ErrorOf([&] { Ask(requestor, timeout); });
+    const auto waited = std::chrono::steady_clock::now() - started;
+    clientGaveUp.Raise();
+    EXPECT_EQ(error.Code(), 180u);
+    EXPECT_EQ(OfKind(server.Received(), 5, 4002).size(), 1u) << "logged on, and the request went out";
+    // Held until the answers stop, the client would wait ten seconds.
+    EXPECT_LT(waited, std::chrono::milliseconds(timeout) + 3s);
+}
+
+TEST_F(RequestorTest, LostConnectionDuringSendIsMadeAgainWithANewLogOn)
+{
+    Signal dropped;
+    ScriptedServer server(u"P", [&](const ScriptedServer::Request &request, ScriptedServer::Peer &peer) {
+        if (request.category == 4) {
+            peer.Send(ScriptedServer::Data(request.id, 0));
+            return;
+        }
+        peer.Send(ScriptedServer::Data(request.id, 0, std::uint32_t(request.connection)));
+        if (request.connection == 1) {
+            peer.Drop();
+            dropped.Raise();
         }
     });
-    RequestorBase requestor(Settings(u"<receivetimeout>300</receivetimeout>"), m_log);
+    RequestorBase requestor(Settings(), m_log);
+    EXPECT_EQ(Ask(requestor), 1u);
+    ASSERT_TRUE(dropped.WaitFor(10s));
 
-    EXPECT_EQ(ErrorOf([&] { Ask(requestor); }).Code(), 180u);
+    EXPECT_EQ(Ask(requestor), 2u) << "answered on a second connection";
+    EXPECT_EQ(server.Connections(), 2);
+    const auto permissions = OfKind(server.Received(), 4, 3001);
+    ASSERT_EQ(permissions.size(), 2u);
+    EXPECT_EQ(permissions[1].connection, 2) << "logged on again";
+    const auto requests = OfKind(server.Received(), 5, 4002);
+    ASSERT_EQ(requests.size(), 2u);
+    EXPECT_EQ(requests[1].connection, 2);
+}
+
+TEST_F(RequestorTest, SendThatCannotFinishRaisesTimeoutDuringSend)
+{
+    // The server logs the client on and then stops reading, so a large
+    // request fills the socket and its send runs out of time.
+    Signal resume;
+    ScriptedServer server(u"P", [&](const ScriptedServer::Request &request, ScriptedServer::Peer &peer) {
+        peer.Send(ScriptedServer::Data(request.id, 0));
+        if (request.category == 4)
+            resume.WaitFor(20s);
+    });
+    RequestorBase requestor(Settings(u"<sendtimeout>300</sendtimeout>"), m_log);
+    tRequestTransferData request(k18, 2, 1004); // a request that carries a list of identifiers
+    const std::vector<GUID> identifiers(200000, cv::vek::rovo::NewRequestIdentifier());
+    request.SetIdentifiers(identifiers.data(), std::int32_t(identifiers.size()));
+
+    const auto error = ErrorOf([&] { requestor.Exchange(3000, request); });
+    resume.Raise();
+    EXPECT_EQ(error.Code(), 180u);
+    EXPECT_THAT(Utf8(error.Message()), HasSubstr("): SKCP:     Timeout during send"));
+    EXPECT_EQ(OfKind(server.Received(), 4, 3001).size(), 1u) << "the log-on went through";
 }
 
 TEST_F(RequestorTest, LostConnectionDuringSendWithBudgetOneCannotConnect)
 {
-    std::atomic<bool> dropped{false};
+    Signal dropped;
     ScriptedServer server(u"P", [&](const ScriptedServer::Request &request, ScriptedServer::Peer &peer) {
         peer.Send(ScriptedServer::Data(request.id, 0));
         peer.Drop();
-        dropped = true;
+        dropped.Raise();
     });
     RequestorBase requestor(Settings(), m_log);
     requestor.Connect(false, 3);
-    while (!dropped)
-        std::this_thread::yield();
+    ASSERT_TRUE(dropped.WaitFor(10s));
 
     tRequestTransferData request(k18, 5, 4002);
     cv::krn::ByteBuffer buffer;
@@ -309,6 +377,7 @@ TEST_F(RequestorTest, MalformedResponseIsAProtocolErrorAndDropsTheConnection)
 
 TEST_F(RequestorTest, NobodyListeningForAnInstanceCannotConnect)
 {
+    testsupport::ScopedEnv connectWindow("CORVANE_COMM_CONNECT_WAIT_MS", "0");
     RequestorBase requestor(Settings(), m_log);
     const auto error = ErrorOf([&] { Ask(requestor); });
     EXPECT_EQ(error.Code(), 65u) << "the comm library's error";

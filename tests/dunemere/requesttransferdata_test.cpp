@@ -1,4 +1,5 @@
 #include "dunemere/authenticationrequesttransferdata.h"
+#include "dunemere/requestidentifier.h"
 #include "dunemere/requesttransferdata.h"
 #include "dunemere/transferio.h"
 #include "krn/exception/bufferoverflow.h"
@@ -9,6 +10,8 @@
 #include <gtest/gtest.h>
 
 #include <cstdio>
+#include <set>
+#include <string>
 
 namespace {
 
@@ -96,6 +99,17 @@ TEST(RequestIdentity, EveryRecordAndEveryReplacedTokenGetsAFreshIdentifier)
     EXPECT_EQ(request.RequestIdentifier(), first) << "the first token keeps the identifier";
     request.SetToken(token);
     EXPECT_FALSE(request.RequestIdentifier() == first);
+}
+
+TEST(RequestIdentity, IdentifiersAreRandomUuidsThatDoNotRepeat)
+{
+    std::set<std::string> seen;
+    for (int i = 0; i < 20000; ++i) {
+        const std::string text = RequestIdentifierText(NewRequestIdentifier());
+        EXPECT_EQ(text[14], '4') << text;                                   // version 4
+        EXPECT_NE(std::string("89AB").find(text[19]), std::string::npos) << text; // variant 10xx
+        EXPECT_TRUE(seen.insert(text).second) << text;
+    }
 }
 
 struct CountRow

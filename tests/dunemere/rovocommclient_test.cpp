@@ -1,16 +1,25 @@
 #include "peerprocess.h"
 
 #include "dunemere/rovocommclient.h"
+#include "dunemere/tointmsgda.h"
+#include "krn/utf.h"
+#include "reference/comm/listener.h"
 #include "sorvik/rovocomm.h"
 #include "support/scopedenv.h"
 #include "support/tempdir.h"
 
 #include <gtest/gtest.h>
 
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
 #include <chrono>
+#include <filesystem>
 #include <fstream>
 #include <regex>
 #include <string>
+#include <system_error>
 #include <vector>
 
 namespace {
@@ -166,12 +175,15 @@ TEST(CommLibraryPath, IsFoundOnceAndKept)
 class ConnectionErrors : public ::testing::Test
 {
 protected:
-    std::pair<std::string, std::string> Attempt(const std::string &binDir, const std::string &name = "P")
+    // Nobody listening is given up on after connectWindow milliseconds.
+    std::pair<std::string, std::string> Attempt(const std::string &binDir, const std::string &name = "P",
+                                                const std::string &connectWindow = "300")
     {
         WriteRegistry(dir.file("registry.ini"), binDir);
         PeerProcess probe(kPeer, {"connect", "localhost", name, "C"},
                           {{"CORVANE_REGISTRY", dir.file("registry.ini").string()},
-                           {"CORVANE_RUNTIME_DIR", dir.path().string()}});
+                           {"CORVANE_RUNTIME_DIR", dir.path().string()},
+                           {"CORVANE_COMM_CONNECT_WAIT_MS", connectWindow}});
         const std::string code = probe.ReadLine().value_or("no answer");
         const std::string message = probe.ReadLine().value_or("");
         EXPECT_EQ(probe.Finish(), 0);
@@ -209,8 +221,8 @@ TEST_F(ConnectionErrors, NobodyListening)
     EXPECT_EQ(code, "65");
     EXPECT_TRUE(std::regex_match(message, std::regex(Expected("65", "SKCP:     Unable to connect to socket!"))))
         << message;
-    // A local server gets a few seconds to come up before the attempt fails.
-    EXPECT_GE(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(4900));
+    // A local server gets the connect window to come up before the attempt fails.
+    EXPECT_GE(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(250));
 }
 
 TEST_F(ConnectionErrors, ConnectsWhenTheServiceListens)
@@ -219,6 +231,73 @@ TEST_F(ConnectionErrors, ConnectsWhenTheServiceListens)
     ASSERT_EQ(peer.ReadLine(), "ready");
     EXPECT_EQ(Attempt(SORVIK_COMM_LIBRARY_DIR).first, "connected");
     EXPECT_EQ(peer.Finish(), 0);
+}
+
+// Somebody who can put a socket where the client looks could stand in for
+// the server and collect what clients send.
+class UntrustedServer : public ::testing::Test
+{
+protected:
+    std::string Outcome()
+    {
+        try {
+            rovoCommClient::Create(WString(u"localhost"), WString(u"P"), WString(u"C"));
+            return "connected";
+        } catch (const DataCache::ToIntMsgDa &error) {
+            return cv::krn::ToUtf8(error.Message());
+        }
+    }
+    static std::string ListenerRefusal(std::u16string_view name)
+    {
+        try {
+            Listener().ListenLocal(name, u"C");
+            return "listening";
+        } catch (const std::system_error &error) {
+            EXPECT_EQ(error.code().value(), EACCES);
+            return error.what();
+        }
+    }
+    std::filesystem::path Run() const { return dir.path() / "run"; }
+
+    testsupport::TempDir dir;
+    testsupport::ScopedEnv runtime{"CORVANE_RUNTIME_DIR", Run().string()};
+};
+
+TEST_F(UntrustedServer, AFolderOthersMayChangeIsRefusedOnBothSides)
+{
+    Listener listener;
+    listener.ListenLocal(u"P", u"C");
+    EXPECT_EQ(Outcome(), "connected");
+
+    ASSERT_EQ(::chmod((Run() / "C").c_str(), 0777), 0);
+    const std::string message = Outcome();
+    EXPECT_NE(message.find("SKCP:     Unable to connect to socket! refused the local server at \"" +
+                           (Run() / "C" / "P.sock").string() + "\""),
+              std::string::npos)
+        << message;
+    EXPECT_NE(message.find("may be changed by other users"), std::string::npos) << message;
+    EXPECT_NE(ListenerRefusal(u"Q").find("may be changed by other users"), std::string::npos);
+}
+
+TEST_F(UntrustedServer, ASocketOrFolderOfAnotherUserIsRefused)
+{
+    if (::geteuid() != 0)
+        GTEST_SKIP() << "only root can give a file to another user";
+    constexpr uid_t kNobody = 65534;
+    Listener listener;
+    listener.ListenLocal(u"P", u"C");
+    const auto socket = Run() / "C" / "P.sock";
+
+    ASSERT_EQ(::chown(socket.c_str(), kNobody, kNobody), 0);
+    std::string message = Outcome();
+    EXPECT_NE(message.find("\"" + socket.string() + "\" belongs to user 65534"), std::string::npos) << message;
+
+    ASSERT_EQ(::chown(socket.c_str(), 0, 0), 0);
+    EXPECT_EQ(Outcome(), "connected");
+    ASSERT_EQ(::chown(Run().c_str(), kNobody, kNobody), 0);
+    message = Outcome();
+    EXPECT_NE(message.find("\"" + Run().string() + "\" belongs to user 65534"), std::string::npos) << message;
+    EXPECT_NE(ListenerRefusal(u"Q").find("belongs to user 65534"), std::string::npos);
 }
 
 } // namespace

@@ -2,6 +2,8 @@
 #include "krn/osdep/inifile.h"
 
 #include "fakehostnetwork.h"
+#include "krn/osdep/qthostnetwork.h"
+#include "nameservicecount.h"
 
 #include <gtest/gtest.h>
 
@@ -170,9 +172,20 @@ TEST(KrnHostInfoSystem, KnowsThisMachine)
     EXPECT_TRUE(info.IsLocal(QHostInfo::localHostName().toStdU16String()));
     EXPECT_TRUE(info.IsLocal(u"127.0.0.1"));
     EXPECT_TRUE(info.IsLocal(u"::1"));
-    // A literal address is answered without asking the name service.
     EXPECT_FALSE(info.IsLocal(u"192.0.2.1"));
-    EXPECT_FALSE(info.IsLocal(u"192.0.2.1"));
+}
+
+TEST(KrnHostInfoSystem, ALiteralAddressIsItsOwnAnswer)
+{
+    QtHostNetwork network;
+    const int before = krntest::NameServiceQueries();
+    EXPECT_EQ(network.Resolve(u"192.0.2.1"), std::vector<QHostAddress>{QHostAddress(QStringLiteral("192.0.2.1"))});
+    EXPECT_EQ(network.Resolve(u"2001:db8::7"), std::vector<QHostAddress>{QHostAddress(QStringLiteral("2001:db8::7"))});
+    EXPECT_EQ(krntest::NameServiceQueries(), before) << "the name service was asked";
+
+    // A name goes to the name service, and the count sees it.
+    network.Resolve(u"localhost");
+    EXPECT_GT(krntest::NameServiceQueries(), before);
 }
 
 } // namespace

@@ -7,8 +7,10 @@
 #include <gtest/gtest.h>
 
 #include <cstdio>
+#include <fstream>
 #include <tuple>
 
+#include <sys/stat.h>
 #include <unistd.h>
 
 namespace {
@@ -290,6 +292,35 @@ TEST_F(LogFileTest, ConsoleGetsUtf8Lines)
     ::dup2(saved, STDOUT_FILENO);
     ::close(saved);
     EXPECT_EQ(ReadBytes(Path("console.txt")), "DSA: ERROR: h\xC3\xA9llo\n");
+}
+
+} // namespace
+
+namespace {
+
+unsigned PermissionsOf(const std::filesystem::path &path)
+{
+    struct stat status = {};
+    EXPECT_EQ(::stat(path.c_str(), &status), 0);
+    return status.st_mode & 0777;
+}
+
+TEST_F(LogFileTest, LogFilesAreReadableByTheirOwnerOnly)
+{
+    {
+        ILogImp log(Name("new.log"));
+        log.Warning(__FILE__, __LINE__) << "line";
+    }
+    EXPECT_EQ(PermissionsOf(Path("new.log")), 0600u);
+
+    // A file that others could read before is closed to them once written to.
+    std::ofstream(Path("old.log")) << "";
+    ASSERT_EQ(::chmod(Path("old.log").c_str(), 0644), 0);
+    {
+        ILogImp log(Name("old.log"));
+        log.Warning(__FILE__, __LINE__) << "line";
+    }
+    EXPECT_EQ(PermissionsOf(Path("old.log")), 0600u);
 }
 
 } // namespace

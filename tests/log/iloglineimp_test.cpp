@@ -18,6 +18,7 @@ class RecordingGlob final : public ILogGlob
 public:
     void WriteLine(std::u16string_view text, LineKind kind, std::uint32_t verbosity) override
     {
+        offered.emplace_back(text);
         if (fail)
             throw std::runtime_error("sink failed");
         lines.emplace_back(text);
@@ -27,6 +28,7 @@ public:
     std::u16string_view LineEnd() const override { return u"\r\n"; }
 
     bool fail = false;
+    std::vector<std::u16string> offered; // written or not
     std::vector<std::u16string> lines;
     std::vector<LineKind> kinds;
     std::vector<std::uint32_t> verbosities;
@@ -118,7 +120,15 @@ TEST_F(LogLineTest, AnEmptyHandleIgnoresAppends)
     none << 1 << "x" << u"y" << 2.0;
     none.Format("%d", 1).FormatLine("%d", 2);
     EXPECT_FALSE(none);
-    EXPECT_TRUE(m_glob.lines.empty());
+
+    // A handle emptied by a move no longer reaches the line it held.
+    ILogOut line = NewLine();
+    ILogOut moved = std::move(line);
+    line << 1 << "x" << u"y" << 2.0;
+    line.Format("%d", 1).FormatLine("%d", 2);
+    moved << "kept";
+    moved = ILogOut();
+    EXPECT_EQ(Written(), u"> kept");
 }
 
 TEST_F(LogLineTest, AFailingSinkStillFreesTheLine)
@@ -128,6 +138,8 @@ TEST_F(LogLineTest, AFailingSinkStillFreesTheLine)
     EXPECT_THROW(line->Release(), std::runtime_error);
     // The handle's destructor swallows the failure instead of terminating.
     EXPECT_NO_THROW(NewLine() << "lost");
+    EXPECT_THAT(m_glob.offered, ::testing::ElementsAre(u"x", u"> lost")) << "both lines reached the failing sink";
+    EXPECT_TRUE(m_glob.lines.empty());
 }
 
 } // namespace

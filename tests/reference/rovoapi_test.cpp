@@ -22,6 +22,23 @@ public:
     explicit RawStore(const std::string &file) { EXPECT_EQ(sqlite3_open(file.c_str(), &m_db), SQLITE_OK); }
     ~RawStore() { sqlite3_close(m_db); }
     void Exec(const char *sql) { EXPECT_EQ(sqlite3_exec(m_db, sql, nullptr, nullptr, nullptr), SQLITE_OK) << sql; }
+    // Each row's columns joined by "|".
+    std::vector<std::string> Rows(const char *sql)
+    {
+        std::vector<std::string> rows;
+        sqlite3_stmt *query = nullptr;
+        EXPECT_EQ(sqlite3_prepare_v2(m_db, sql, -1, &query, nullptr), SQLITE_OK) << sql;
+        while (query && sqlite3_step(query) == SQLITE_ROW) {
+            std::string row;
+            for (int column = 0; column < sqlite3_column_count(query); ++column) {
+                const auto *text = reinterpret_cast<const char *>(sqlite3_column_text(query, column));
+                row += (column ? "|" : "") + std::string(text ? text : "");
+            }
+            rows.push_back(row);
+        }
+        sqlite3_finalize(query);
+        return rows;
+    }
 
 private:
     sqlite3 *m_db = nullptr;
@@ -275,21 +292,135 @@ TEST_F(Store, ExportThenImportReproducesTheConfiguration)
     auto view = View();
     OkVoid([&](std::int32_t *status) { view->ExportConfiguration(WString(U16(exported)), editor.get(), status); });
 
-    // Into another Sorvik: nothing arrives before its commit.
-    auto other = Open(u"<Name>Lab Server</Name><SorvikType>valdorn</SorvikType>");
+    // Into another Sorvik: its store has nothing before the commit.
+    const char16_t *lab = u"<Name>Lab Server</Name><SorvikType>valdorn</SorvikType>";
+    auto other = Open(lab);
     EXPECT_EQ(Utf8(Ok([&](std::int32_t *status) { return other->GetSorvikName(status); })), "Lab Server");
     auto otherView = View(other.get());
     auto otherEditor = Editor(other.get());
     OkVoid([&](std::int32_t *status) {
         otherView->ImportConfiguration(WString(U16(exported)), otherEditor.get(), status);
     });
-    EXPECT_TRUE(Areas(otherView.get()).empty());
+    auto elsewhere = Open(lab);
+    EXPECT_TRUE(Areas(View(elsewhere.get()).get()).empty());
     Commit(otherEditor.get());
     EXPECT_EQ(Areas(otherView.get()), Areas(view.get()));
+    EXPECT_EQ(Areas(View(elsewhere.get()).get()), Areas(view.get()));
 
     const std::string again = File("again.skc");
     OkVoid([&](std::int32_t *status) { otherView->ExportConfiguration(WString(U16(again)), nullptr, status); });
     EXPECT_EQ(Slurp(again), Slurp(exported));
+}
+
+TEST_F(Store, ViewsOfTheImportingSorvikShowTheImportUntilItIsCommittedOrDropped)
+{
+    auto editor = Editor();
+    AddArea(editor.get(), u"/data/old", u"Old");
+    Commit(editor.get());
+    AddArea(editor.get(), u"/data/new", u"New");
+    AddExcluded(editor.get(), u"/data/new/tmp", u"tmp");
+    OkVoid([&](std::int32_t *status) { editor->SetIdleTime(77, status); });
+    const std::string file = File("new.skc");
+    auto view = View();
+    OkVoid([&](std::int32_t *status) { view->ExportConfiguration(WString(U16(file)), editor.get(), status); });
+    editor.Reset();
+
+    // A properties dialog reloads its pages from the view after an import.
+    auto importing = Editor();
+    EXPECT_EQ(Areas(view.get()), std::vector<std::string>{"/data/old|/data/old|Old"}) << "before the import: the store";
+    OkVoid([&](std::int32_t *status) { view->ImportConfiguration(WString(U16(file)), importing.get(), status); });
+    auto otherView = View();
+    for (auto *shown : {view.get(), otherView.get()}) {
+        EXPECT_EQ(Areas(shown), (std::vector<std::string>{"/data/old|/data/old|Old", "/data/new|/data/new|New", "  /data/new/tmp"}));
+        EXPECT_EQ(Ok([&](std::int32_t *status) { return shown->GetIdleTime(status); }), 77u);
+        EXPECT_TRUE(Ok([&](std::int32_t *status) { return shown->IsExcludedFolder(WString(u"/data/new/tmp/"), status); }));
+    }
+    AddArea(importing.get(), u"/data/later", u"Later");
+    EXPECT_EQ(Areas(view.get()).back(), "/data/later|/data/later|Later") << "with what is recorded after the import";
+    auto elsewhere = Open();
+    EXPECT_EQ(Areas(View(elsewhere.get()).get()).size(), 1u) << "another Sorvik object sees only the store";
+
+    importing.Reset();
+    EXPECT_EQ(Areas(view.get()).size(), 1u) << "an import dropped with its editor is gone";
+
+    importing = Editor();
+    OkVoid([&](std::int32_t *status) { view->ImportConfiguration(WString(U16(file)), importing.get(), status); });
+    Commit(importing.get());
+    EXPECT_EQ(Areas(View(elsewhere.get()).get()).size(), 3u);
+    EXPECT_EQ(Areas(view.get()).size(), 3u) << "committed: the store again";
+}
+
+TEST_F(Store, AnImportReplacesTheWholeConfigurationButKeepsPolicyAndPendingRequests)
+{
+    // What the file brings, written from another Sorvik.
+    auto lab = Open(u"<Name>Lab</Name>");
+    auto labEditor = Editor(lab.get());
+    AddArea(labEditor.get(), u"/new/data", u"New");
+    OkVoid([&](std::int32_t *status) { labEditor->SetIdleTime(45, status); });
+    Commit(labEditor.get());
+    const std::string file = File("lab.skc");
+    OkVoid([&](std::int32_t *status) { View(lab.get())->ExportConfiguration(WString(U16(file)), nullptr, status); });
+
+    // A store that already holds areas, settings, Parselet choices, a policy
+    // and a request the server has not taken yet.
+    auto editor = Editor();
+    AddArea(editor.get(), u"/old/one", u"One");
+    AddExcluded(editor.get(), u"/old/one/tmp", u"tmp");
+    AddArea(editor.get(), u"/old/two", u"Two");
+    OkVoid([&](std::int32_t *status) { editor->SetIdleTime(300, status); });
+    OkVoid([&](std::int32_t *status) { editor->SetSearchQueryTimeout(45, status); });
+    OkVoid([&](std::int32_t *status) { editor->SetParseletActive(WString(u"CSV"), 0, status); });
+    auto order = Container({u"CSV", u"TextTable"});
+    OkVoid([&](std::int32_t *status) { editor->SetExtensionParselets(WString(u"txt"), order.get(), status); });
+    OkVoid([&](std::int32_t *status) { editor->StartIndexingNow(0, status); });
+    Commit(editor.get());
+    RawStore raw(StoreFile());
+    raw.Exec("INSERT INTO area_policy(prefix) VALUES ('/etc')");
+
+    auto view = View();
+    OkVoid([&](std::int32_t *status) { view->ImportConfiguration(WString(U16(file)), editor.get(), status); });
+    Commit(editor.get());
+
+    EXPECT_EQ(Areas(view.get()), (std::vector<std::string>{"/new/data|/new/data|New"}));
+    EXPECT_EQ(IdleTime(view.get()), 45u);
+    std::uint32_t browse = 1, query = 1;
+    OkVoid([&](std::int32_t *status) { view->GetTimeouts(&browse, &query, status); });
+    EXPECT_EQ(query, 0u);
+    EXPECT_TRUE(raw.Rows("SELECT * FROM parselets").empty()) << "the file chose no Parselets";
+    EXPECT_TRUE(raw.Rows("SELECT * FROM extension_priorities").empty());
+    EXPECT_EQ(raw.Rows("SELECT prefix FROM area_policy"), std::vector<std::string>{"/etc"});
+    EXPECT_EQ(raw.Rows("SELECT kind, argument FROM requests"), std::vector<std::string>{"start-indexing|0"});
+}
+
+TEST_F(Store, ACommitLeavesWorkOrdersForTheServerAndAFailedOneLeavesNone)
+{
+    RawStore raw(StoreFile());
+    auto requests = [&] { return raw.Rows("SELECT kind, argument FROM requests ORDER BY id"); };
+    auto editor = Editor();
+    OkVoid([&](std::int32_t *status) { editor->StartIndexingNow(0, status); });
+    OkVoid([&](std::int32_t *status) { editor->SetIndexPath(WString(u"/var/index/"), status); });
+    auto names = Container({u"CSV", u"hdf5"});
+    OkVoid([&](std::int32_t *status) { editor->ReindexParselets(names.get(), status); });
+    EXPECT_TRUE(requests().empty()) << "nothing before the commit";
+    Commit(editor.get());
+    EXPECT_EQ(requests(), (std::vector<std::string>{"start-indexing|0", "move-index|/var/index", "reindex-parselet|CSV",
+                                                    "reindex-parselet|HDF5"}));
+
+    // The same index folder again moves nothing.
+    OkVoid([&](std::int32_t *status) { editor->SetIndexPath(WString(u"/VAR/index"), status); });
+    Commit(editor.get());
+    EXPECT_EQ(requests().size(), 4u);
+
+    // A commit that fails leaves none of its orders.
+    AddArea(editor.get(), u"/a", u"Same");
+    AddArea(editor.get(), u"/b", u"same");
+    OkVoid([&](std::int32_t *status) { editor->StartIndexingNow(0, status); });
+    OkVoid([&](std::int32_t *status) { editor->SetIndexPath(WString(u"/elsewhere"), status); });
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) { editor->CommitConfiguration(status); }), status::Conflict);
+    EXPECT_EQ(requests().size(), 4u);
+
+    OkVoid([&](std::int32_t *status) { m_sorvik->ResetSorvik(cv::rovo::kResetIndex, 0, status); });
+    EXPECT_EQ(requests().back(), "reset-index|4");
 }
 
 TEST_F(Store, AnExportCarriesUncommittedEditsWithoutCommittingThem)

@@ -3,11 +3,12 @@
 
 #include "tests/reference/rovofixture.h"
 
+#include <poll.h>
 #include <spawn.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
-#include <cstdio>
+#include <chrono>
 #include <string>
 
 extern char **environ;
@@ -37,23 +38,56 @@ public:
         close(toChild[0]);
         close(fromChild[1]);
         m_stdin = toChild[1];
-        m_stdout = fdopen(fromChild[0], "r");
+        m_stdout = fromChild[0];
     }
 
     ~Reader()
     {
         if (m_stdin >= 0)
             close(m_stdin);
-        if (m_stdout)
-            std::fclose(m_stdout);
+        if (m_stdout >= 0)
+            close(m_stdout);
         if (m_pid > 0)
             waitpid(m_pid, nullptr, 0);
     }
 
-    std::string Line()
+    // The next line without its line end; empty at the end of the output or
+    // when the time ran out.
+    std::string Line(std::chrono::milliseconds within = std::chrono::seconds(20))
     {
-        char buffer[256] = {};
-        return std::fgets(buffer, sizeof buffer, m_stdout) ? std::string(buffer) : std::string();
+        const auto deadline = std::chrono::steady_clock::now() + within;
+        for (;;) {
+            if (const std::size_t end = m_pending.find('\n'); end != std::string::npos) {
+                std::string line = m_pending.substr(0, end);
+                m_pending.erase(0, end + 1);
+                return line;
+            }
+            const auto left = std::chrono::duration_cast<std::chrono::milliseconds>(deadline - std::chrono::steady_clock::now());
+            pollfd entry{m_stdout, POLLIN, 0};
+            if (left.count() <= 0 || poll(&entry, 1, int(left.count())) <= 0)
+                return {};
+            char chunk[4096];
+            const ssize_t got = read(m_stdout, chunk, sizeof chunk);
+            if (got <= 0)
+                return {};
+            m_pending.append(chunk, std::size_t(got));
+        }
+    }
+
+    // Reads lines until the given one; false when it did not come in time.
+    bool WaitForLine(const std::string &expected)
+    {
+        const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(20);
+        for (;;) {
+            const auto left = std::chrono::duration_cast<std::chrono::milliseconds>(deadline - std::chrono::steady_clock::now());
+            if (left.count() <= 0)
+                return false;
+            const std::string line = Line(left);
+            if (line == expected)
+                return true;
+            if (line.empty())
+                return false;
+        }
     }
 
     // Tells the reader to stop; returns its report and exit code.
@@ -61,7 +95,9 @@ public:
     {
         close(m_stdin);
         m_stdin = -1;
-        std::string report = Line();
+        std::string report;
+        for (std::string line = Line(); !line.empty(); line = Line())
+            report = line;
         int status = 0;
         waitpid(m_pid, &status, 0);
         m_pid = -1;
@@ -71,18 +107,30 @@ public:
 private:
     pid_t m_pid = -1;
     int m_stdin = -1;
-    std::FILE *m_stdout = nullptr;
+    int m_stdout = -1;
+    std::string m_pending;
 };
+
+// The number after "name=" in the reader's report, or -1.
+long ReportValue(const std::string &report, const std::string &name)
+{
+    const std::size_t at = report.find(name + "=");
+    return at == std::string::npos ? -1 : std::stol(report.substr(at + name.size() + 1));
+}
 
 using StoreProcesses = RovoTest;
 
 TEST_F(StoreProcesses, AReaderSeesWholeCommitsOnly)
 {
     constexpr std::uint32_t perGeneration = 60;
+    constexpr int generations = 15;
     Reader reader(perGeneration);
-    ASSERT_EQ(reader.Line(), "ready\n");
+    ASSERT_EQ(reader.Line(), "ready");
+    ASSERT_EQ(reader.Line(), "seen none");
 
-    for (int generation = 1; generation <= 15; ++generation) {
+    // Each commit starts while the reader reads the one before it, so its
+    // reads overlap the commits however busy the machine is.
+    for (int generation = 1; generation <= generations; ++generation) {
         auto editor = Editor();
         for (std::uint32_t i = 0; generation > 1 && i < perGeneration; ++i) {
             const std::u16string old = U16("/gen/" + std::to_string(generation - 1) + "/" + std::to_string(i));
@@ -94,11 +142,14 @@ TEST_F(StoreProcesses, AReaderSeesWholeCommitsOnly)
             AddArea(editor.get(), path.c_str(), alias.c_str());
         }
         Commit(editor.get());
+        ASSERT_TRUE(reader.WaitForLine("seen /gen/" + std::to_string(generation))) << "generation " << generation;
     }
 
     const auto [report, exitCode] = reader.Finish();
     EXPECT_EQ(exitCode, 0) << report;
-    EXPECT_NE(report.find("torn=0"), std::string::npos) << report;
+    EXPECT_EQ(ReportValue(report, "torn"), 0) << report;
+    EXPECT_EQ(ReportValue(report, "generations"), generations + 1) << report;
+    EXPECT_GT(ReportValue(report, "reads"), generations) << report;
     EXPECT_EQ(Areas().size(), perGeneration);
 }
 

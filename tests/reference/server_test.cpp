@@ -9,13 +9,20 @@
 #include "dunemere/requesttransferdata.h"
 #include "dunemere/responsetransferdata.h"
 #include "dunemere/tointmsgda.h"
+#include "krn/utf.h"
 #include "log/ilogimp.h"
 #include "sorvik/packedversion.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <fcntl.h>
+#include <poll.h>
 #include <signal.h>
+#include <sqlite3.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
 #include <condition_variable>
 #include <fstream>
@@ -27,9 +34,9 @@ namespace {
 using namespace cv::vek::rovo::dunemere;
 using cv::vek::rovo::RequestorBase;
 using reftest::ServerTest;
+using sorvik::PackVersion;
 using testsupport::AccessRef;
 using testsupport::StoppedCallback;
-using sorvik::PackVersion;
 
 [[maybe_unused]] const bool g_registry = (reftest::InstallServerRegistry(), true);
 
@@ -54,11 +61,34 @@ bool WaitFor(Condition condition, std::chrono::milliseconds within = std::chrono
     return true;
 }
 
+// The statistics counters of the index status as "name=value" in name order.
+std::string CountersIn(const std::filesystem::path &statusFile)
+{
+    sqlite3 *db = nullptr;
+    EXPECT_EQ(sqlite3_open_v2(statusFile.c_str(), &db, SQLITE_OPEN_READONLY, nullptr), SQLITE_OK);
+    sqlite3_busy_timeout(db, 5000);
+    std::string counters;
+    sqlite3_stmt *query = nullptr;
+    if (sqlite3_prepare_v2(db,
+                           "SELECT name, value FROM counters WHERE name IN ('disk_full_crawl_stop', 'failures', "
+                           "'not_my_file') ORDER BY name",
+                           -1, &query, nullptr) == SQLITE_OK) {
+        while (sqlite3_step(query) == SQLITE_ROW)
+            counters += std::string(counters.empty() ? "" : " ") +
+                        reinterpret_cast<const char *>(sqlite3_column_text(query, 0)) + '=' +
+                        std::to_string(sqlite3_column_int64(query, 1));
+    }
+    sqlite3_finalize(query);
+    sqlite3_close(db);
+    return counters;
+}
+
 TEST_F(ServerTest, StatisticsComeFromTheIndexStatusAndResetsChangeIt)
 {
     auto server = Start({"--portname", "P"}, "P");
     AccessRef access{CreateDirectStoreAccess(u"P", 0)};
     EXPECT_EQ(access->GetElementCount(8), 0u);
+    const auto Counters = [this] { return CountersIn(StatusFile()); };
 
     Sql("INSERT INTO element_counts VALUES (8, 120), (16, 7), (32, 3456);"
         "INSERT INTO parselet_timeouts VALUES ('CSV', 3), ('HDF', 2);"
@@ -82,13 +112,41 @@ TEST_F(ServerTest, StatisticsComeFromTheIndexStatusAndResetsChangeIt)
     access->ResetIndexStatusTimeouted(); // 18.0.0 no longer knows it
     EXPECT_EQ(access->GetFileviewsTimeouted(), 5u);
     access->ResetIndexStatusFailure();
+    EXPECT_EQ(Counters(), "disk_full_crawl_stop=1 failures=0 not_my_file=5");
     access->ResetIndexStatusNotMyFile();
-    AccessRef second{CreateDirectStoreAccess(u"P", 0)};
-    EXPECT_EQ(second->GetUserCount(0), 2u);
+    EXPECT_EQ(Counters(), "disk_full_crawl_stop=1 failures=0 not_my_file=0");
+    {
+        AccessRef second{CreateDirectStoreAccess(u"P", 0)};
+        EXPECT_EQ(second->GetUserCount(0), 2u);
+    }
+    EXPECT_TRUE(WaitFor([&] { return access->GetUserCount(0) == 1u; })) << "the second user's session ended";
 
     EXPECT_EQ(server->Stop(SIGTERM), 0);
     EXPECT_FALSE(std::filesystem::exists(testsupport::SorvikProcess::SocketOf("P")));
     EXPECT_FALSE(MutexHeld(InstanceMutexName(u"P")));
+}
+
+TEST_F(ServerTest, AStatusStoreThatFailsIsAnsweredWithItsStatusCode)
+{
+    auto server = Start({"--portname", "P"}, "P");
+    cv::util::file::log::ILogImp log;
+    PLUGIN::Config config(u"<server>localhost</server><portname>P</portname>");
+    RequestorBase requestor(config, log);
+    cv::vek::rovo::tRequestTransferData request(config.GetServerVersion(), 5, 4003);
+    EXPECT_EQ(cv::vek::rovo::tResponseTransferData(requestor.Exchange(5000, request)).Value(), 0u);
+
+    Sql("DROP TABLE counters");
+    cv::vek::rovo::tRequestTransferData again(config.GetServerVersion(), 5, 4003);
+    try {
+        requestor.Exchange(5000, again);
+        ADD_FAILURE() << "answered without its counters";
+    } catch (const DataCache::ToIntMsgDa &error) {
+        EXPECT_EQ(error.Code(), 181u);
+        EXPECT_NE(error.Message().find(u"Failed with error code -500!"), std::u16string::npos);
+    }
+    cv::vek::rovo::tRequestTransferData elements(config.GetServerVersion(), 5, 4002);
+    EXPECT_EQ(cv::vek::rovo::tResponseTransferData(requestor.Exchange(5000, elements)).Value(), 0u)
+        << "the rest of the status still answers";
 }
 
 TEST_F(ServerTest, OlderServersAreSpokenToInTheirVersion)
@@ -186,8 +244,8 @@ TEST_F(ServerTest, LocalServerIsStartedWhenItDoesNotRunAndOnlyThen)
 
 TEST_F(ServerTest, LocalServerThatCannotBeStartedIsReported)
 {
-    std::ofstream(m_dir.file("registry.ini")) << "[Software\\Corvane\\Common\\SorvikDesktop]\nbinDir="
-                                              << m_dir.file("nothing-here").string() << "\n";
+    std::ofstream(m_dir.file("registry.ini"))
+        << "[Software\\Corvane\\Common\\SorvikDesktop]\nbinDir=" << m_dir.file("nothing-here").string() << "\n";
     testsupport::ScopedEnv registry("CORVANE_REGISTRY", m_dir.file("registry.ini").string());
     cv::util::file::log::ILogImp log;
     PLUGIN::Config config(u"<server>localhost</server>");
@@ -243,8 +301,117 @@ TEST_F(ServerTest, StatsCommandEndsWhenTheServerDoes)
     EXPECT_EQ(waiting.Wait(std::chrono::seconds(10)), 0);
     EXPECT_NE(FileText(m_dir.file("wait.out")).find("stopped: S"), std::string::npos);
 
+    testsupport::ScopedEnv connectWindow("CORVANE_COMM_CONNECT_WAIT_MS", "0");
     testsupport::SorvikProcess unanswered(SORVIK_HOST, {"stats", "--portname", "S"});
     EXPECT_EQ(unanswered.Wait(std::chrono::seconds(30)), 3) << "nobody answers any more";
+}
+
+// What `out=$(sorvik-config stats)` does: read the client's output until
+// every writer of the pipe is gone.
+std::string ReadUntilEndOfFile(int fd, std::chrono::milliseconds within, bool &ended)
+{
+    const auto deadline = std::chrono::steady_clock::now() + within;
+    std::string text;
+    ended = false;
+    for (;;) {
+        const auto left = std::chrono::duration_cast<std::chrono::milliseconds>(deadline - std::chrono::steady_clock::now());
+        pollfd entry{fd, POLLIN, 0};
+        if (left.count() <= 0 || ::poll(&entry, 1, int(left.count())) <= 0)
+            return text;
+        char buffer[4096];
+        const ssize_t got = ::read(fd, buffer, sizeof buffer);
+        if (got <= 0) {
+            ended = got == 0;
+            return text;
+        }
+        text.append(buffer, std::size_t(got));
+    }
+}
+
+TEST_F(ServerTest, AClientsOutputEndsWithTheClientWhileTheServerItStartedRuns)
+{
+    int output[2];
+    ASSERT_EQ(::pipe2(output, O_CLOEXEC), 0);
+    const pid_t client = ::fork();
+    ASSERT_GE(client, 0);
+    if (client == 0) {
+        ::dup2(output[1], STDOUT_FILENO);
+        ::dup2(output[1], STDERR_FILENO);
+        ::execl(SORVIK_HOST, "sorvik-config", "stats", static_cast<char *>(nullptr));
+        ::_exit(127);
+    }
+    ::close(output[1]);
+    bool ended = false;
+    const std::string text = ReadUntilEndOfFile(output[0], std::chrono::seconds(30), ended);
+    ::close(output[0]);
+    int status = -1;
+    ::waitpid(client, &status, 0);
+
+    EXPECT_TRUE(ended) << "the output of the client stayed open";
+    EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0) << text;
+    EXPECT_NE(text.find("GetUserCount(0): 1\n"), std::string::npos) << text;
+    EXPECT_TRUE(MutexHeld(kGlobalServerMutexName)) << "the server the client started still runs";
+
+    // Its output went to a log of its own, for its owner's eyes only.
+    const auto log = m_dir.path() / "run" / "Sorvik.log";
+    struct stat logStatus = {};
+    EXPECT_EQ(::stat(log.c_str(), &logStatus), 0);
+    EXPECT_EQ(logStatus.st_mode & 0777, 0600u);
+    EXPECT_NE(FileText(log).find("logged on: (anonymous)"), std::string::npos);
+
+    ::kill(StartedServerPid(), SIGTERM);
+    EXPECT_TRUE(WaitFor([] { return !MutexHeld(kGlobalServerMutexName); }));
+}
+
+bool Holds(const std::string &bytes, const std::string &secret)
+{
+    std::string utf16;
+    for (const char c : secret)
+        utf16 += {c, '\0'};
+    return bytes.find(secret) != std::string::npos || bytes.find(utf16) != std::string::npos;
+}
+
+TEST_F(ServerTest, TheSecretKeyAppearsInNoLogLineAndNoErrorText)
+{
+    const std::string secret = "Zq7-secret-Key-4711";
+    auto server = Start({"--portname", "Id", "--identification", "tool", "--secretkey", secret}, "Id",
+                        m_dir.file("server.out"));
+    const auto logFile = m_dir.file("client.log");
+    std::vector<std::string> errors;
+    const auto exchange = [&](const std::string &key) {
+        // Every verbosity, every prefix, into the file.
+        const std::string settings = "<server>localhost</server><portname>Id</portname>"
+                                     "<logfile bitmask=\"0xFFFFFFFF\" outbitmask=\"0xC0000002\">" +
+                                     logFile.string() +
+                                     "</logfile><clientidentificationstring>tool</clientidentificationstring>"
+                                     "<clientidentificationsecretkey>" +
+                                     key + "</clientidentificationsecretkey>";
+        cv::util::file::log::ILogImp log;
+        PLUGIN::Config config(cv::krn::ToUtf16(settings), log);
+        RequestorBase requestor(config, log);
+        cv::vek::rovo::tRequestTransferData request(config.GetServerVersion(), 5, 4001);
+        try {
+            requestor.Exchange(5000, request);
+            return true;
+        } catch (const DataCache::ToIntMsgDa &error) {
+            errors.push_back(cv::krn::ToUtf8(error.Message()));
+            return false;
+        }
+    };
+
+    EXPECT_TRUE(exchange(secret));
+    EXPECT_FALSE(exchange(secret + "x")) << "a wrong key is refused";
+    server->Stop(SIGTERM);
+    EXPECT_FALSE(exchange(secret)) << "nobody answers";
+
+    ASSERT_EQ(errors.size(), 2u);
+    for (const std::string &error : errors)
+        EXPECT_FALSE(Holds(error, secret)) << error;
+    const std::string logged = FileText(logFile);
+    EXPECT_NE(logged.find(std::string("P\0e\0r\0m\0i\0s\0s\0i\0o\0n\0", 20)), std::string::npos)
+        << "the log holds the exchange";
+    EXPECT_FALSE(Holds(logged, secret));
+    EXPECT_FALSE(Holds(FileText(m_dir.file("server.out")), secret));
 }
 
 } // namespace

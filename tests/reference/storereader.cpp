@@ -4,8 +4,10 @@
 // generation ("/gen/<k>/<i>", a fixed count), so a consistent read holds
 // either no areas or exactly that count, all of one generation.
 //
-// stdout: "ready" after the first read, then at the end
-// "reads=<n> generations=<g> torn=<t>". It stops when stdin closes.
+// stdout: "ready" after the first read, "seen <generation>" whenever a read
+// shows another generation than the read before it ("none" for no areas),
+// and at the end "reads=<n> generations=<g> torn=<t>". It stops when stdin
+// closes.
 
 #include "tests/reference/referencelibs.h"
 
@@ -36,6 +38,7 @@ int main(int argc, char **argv)
 
     long reads = 0, torn = 0;
     std::set<std::string> generations;
+    std::string last;
     for (bool first = true;; first = false) {
         auto areas = RefPtr<cv::vekex::IStringList>::Adopt(view->ListSearchAreas(&status));
         if (status != 0 || !areas) {
@@ -50,11 +53,14 @@ int main(int argc, char **argv)
         ++reads;
         if (areas->GetCount() != 0 && (areas->GetCount() != perGeneration || seen.size() != 1))
             ++torn;
-        generations.insert(seen.empty() ? std::string("none") : *seen.begin());
-        if (first) {
+        const std::string generation = seen.empty() ? std::string("none") : *seen.begin();
+        generations.insert(generation);
+        if (first)
             std::printf("ready\n");
-            std::fflush(stdout);
-        }
+        if (generation != last)
+            std::printf("seen %s\n", generation.c_str());
+        std::fflush(stdout);
+        last = generation;
         pollfd input{STDIN_FILENO, POLLIN, 0};
         if (poll(&input, 1, 0) > 0) {
             char byte;

@@ -1,5 +1,7 @@
 #include "support/sorvikprocess.h"
 
+#include "krn/osdep/runtimefolder.h"
+
 #include <fcntl.h>
 #include <signal.h>
 #include <spawn.h>
@@ -39,8 +41,7 @@ SorvikProcess::~SorvikProcess()
 
 std::filesystem::path SorvikProcess::SocketOf(const std::string &portName)
 {
-    const char *runtime = std::getenv("CORVANE_RUNTIME_DIR");
-    const std::filesystem::path root = runtime && *runtime ? runtime : "/tmp/corvane-run";
+    const std::filesystem::path root = cv::krn::osdep::RuntimeDirectory();
     if (portName.empty())
         return root / "VEK_INDEX_SERVICE_SEARCH_BROWSE" / "VEK_INDEX_SERVICE.sock";
     return root / "VEK_INDEX_SERVICE_SERVER" / (portName + ".sock");
