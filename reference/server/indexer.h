@@ -7,7 +7,6 @@
 #include <QDateTime>
 
 #include <chrono>
-#include <condition_variable>
 #include <cstdint>
 #include <mutex>
 #include <optional>

@@ -1,13 +1,11 @@
 #include "reference/server/indexpass.h"
 
-#include "reference/libsupport/refobject.h"
 
 #include <dirent.h>
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include <unordered_set>
 
 namespace sorvik::server {
 
