@@ -183,6 +183,7 @@ TEST_F(PropertySideTest, APropertyWhoseFilesWereDeletedStaysOptimizedWithNoOccur
     const cv::rovo::PropertyRecord recorded = Record(u"recorded");
     OkVoid([&](std::int32_t *status) { editor->OptimizeProperty(WString(u"sorvik_root"), &recorded, 0, status); });
     OkVoid([&](std::int32_t *status) { editor->Commit(status); });
+    ASSERT_EQ(StatusOf([&](std::int32_t *status) { manager->WaitForUpdate(status); }), 0);
 
     std::filesystem::remove(Data("c.asc"));
     Configure([](cv::rovo::IConfigurationEditor *configuration) {
