@@ -29,6 +29,7 @@
 
 #include <cstdio>
 #include <list>
+#include <optional>
 
 #include <poll.h>
 #include <sys/eventfd.h>
@@ -207,12 +208,21 @@ void Server::State::TakeUp(const CommittedConfiguration &committed)
     bool indexAgain = false;
     for (const rovo::StoreRequest &request : committed.requests)
         indexAgain = DoRequest(request) || indexAgain;
-    FollowIndexLocation(settings.indexPath);
+    // An index that cannot move stays where it is and goes on indexing what
+    // this configuration says; the waiting clients learn why.
+    std::optional<ref::Failure> notMoved;
+    try {
+        FollowIndexLocation(settings.indexPath);
+    } catch (const ref::Failure &failure) {
+        notMoved = failure;
+    }
     indexer->TakeUp(MakePlan(committed.configuration, Catalogue()), IndexerSettingsOf(settings), indexAgain);
     const std::int64_t lastRequest =
         committed.requests.empty() ? status->AppliedRequest() : committed.requests.back().id;
     status->RecordApplied(committed.generation, lastRequest);
     Announce("applied configuration %lld\n", committed.generation);
+    if (notMoved)
+        throw *notMoved;
 }
 
 // True when the request asks for indexing.

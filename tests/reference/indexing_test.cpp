@@ -278,6 +278,24 @@ TEST_F(IndexingProcessTest, AMovedIndexLocationKeepsTheIndex)
     EXPECT_EQ(Counts(), (ElementCounts{1, 1, 2}));
 }
 
+TEST_F(IndexingProcessTest, AnIndexFolderThatCannotBeMadeLeavesTheIndexWhereItIsAndTheWaitSaysWhy)
+{
+    Write("a.csv", CsvText({}, {"x", "y"}));
+    IndexData();
+    auto server = StartIndexing();
+    const std::filesystem::path first = StatusFile();
+    const std::filesystem::path blocked = Write("blocked.md", "a file, not a folder") / "index";
+
+    Configure([&](cv::rovo::IConfigurationEditor *editor) {
+        OkVoid([&](std::int32_t *status) { editor->SetIndexPath(WString(U16(blocked.string())), status); });
+        OkVoid([&](std::int32_t *status) { editor->StartIndexingNow(0, status); });
+    });
+    EXPECT_EQ(StatusOf([&](std::int32_t *status) { Manager()->WaitForUpdate(status); }), status::Internal);
+    Write("b.csv", CsvText({}, {"x"}));
+    ASSERT_TRUE(WaitFor([&] { return Counts().files == 2; })) << "it goes on indexing";
+    EXPECT_TRUE(std::filesystem::exists(first));
+}
+
 TEST_F(IndexingProcessTest, AServerIndexesAtItsStartOnlyWhatIsMissingOrOutdated)
 {
     Write("a.csv", CsvText({}, {"x"}));
