@@ -197,7 +197,7 @@ private:
     bool DoRequest(const rovo::StoreRequest &request);
     void ChangeOptimization(const rovo::StoreRequest &request);
     void FollowIndexLocation(const QString &folder);
-    const rovo::CatalogueInfo &Catalogue();
+    const rovo::CatalogueInfo *Catalogue();
 };
 
 // What the server does with a configuration it takes up.
@@ -216,7 +216,10 @@ void Server::State::TakeUp(const CommittedConfiguration &committed)
     } catch (const ref::Failure &failure) {
         notMoved = failure;
     }
-    indexer->TakeUp(MakePlan(committed.configuration, Catalogue()), IndexerSettingsOf(settings), indexAgain);
+    // Without a catalogue the server cannot tell what reads a file, and
+    // leaves the index as it is rather than empty it.
+    if (const rovo::CatalogueInfo *parselets = Catalogue())
+        indexer->TakeUp(MakePlan(committed.configuration, *parselets), IndexerSettingsOf(settings), indexAgain);
     const std::int64_t lastRequest =
         committed.requests.empty() ? status->AppliedRequest() : committed.requests.back().id;
     status->RecordApplied(committed.generation, lastRequest);
@@ -273,8 +276,9 @@ void Server::State::FollowIndexLocation(const QString &folder)
 }
 
 // The catalogue as the data-store library has it now; when it cannot be
-// read, the last one read, so that a passing failure does not empty the index.
-const rovo::CatalogueInfo &Server::State::Catalogue()
+// read, the last one read, so that a passing failure does not empty the
+// index; null when there has never been one.
+const rovo::CatalogueInfo *Server::State::Catalogue()
 {
     if (dataStore) {
         try {
@@ -283,9 +287,7 @@ const rovo::CatalogueInfo &Server::State::Catalogue()
             Report(QStringLiteral("cannot read the Parselet catalogue: %1").arg(QString::fromStdU16String(failure.text)));
         }
     }
-    if (!catalogue)
-        catalogue = std::make_shared<rovo::CatalogueInfo>();
-    return *catalogue;
+    return catalogue.get();
 }
 
 namespace {

@@ -296,6 +296,28 @@ TEST_F(IndexingProcessTest, AnIndexFolderThatCannotBeMadeLeavesTheIndexWhereItIs
     EXPECT_TRUE(std::filesystem::exists(first));
 }
 
+TEST_F(IndexingProcessTest, AServerWithoutItsParseletCatalogueLeavesTheIndexAsItIs)
+{
+    Write("a.csv", CsvText({}, {"x", "y"}));
+    IndexData();
+    auto server = StartIndexing();
+    EXPECT_EQ(server->Stop(SIGTERM), 0);
+
+    std::ofstream(m_dir.file("broken.xml")) << "<parselets format=\"1\">";
+    {
+        testsupport::ScopedEnv broken("CORVANE_VEKEX_CATALOGUE", m_dir.file("broken.xml").string());
+        server = Start({"--portname", kPort}, kPort, m_dir.file("broken.out"));
+    }
+    Write("b.csv", CsvText({}, {"x"}));
+    Configure([](cv::rovo::IConfigurationEditor *editor) {
+        OkVoid([&](std::int32_t *status) { editor->StartIndexingNow(0, status); });
+    });
+    WaitUntilIndexed();
+    EXPECT_EQ(Progress().passes, 0);
+    EXPECT_EQ(Counts(), (ElementCounts{1, 1, 2})) << "nothing indexed, nothing lost";
+    EXPECT_EQ(server->Stop(SIGTERM), 0);
+}
+
 TEST_F(IndexingProcessTest, AServerIndexesAtItsStartOnlyWhatIsMissingOrOutdated)
 {
     Write("a.csv", CsvText({}, {"x"}));
