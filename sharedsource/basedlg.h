@@ -8,6 +8,7 @@
 #include "sharedsource/dialogfont.h"
 #include "sharedsource/dialogtemplate.h"
 #include "sharedsource/flexdialog.h"
+#include "sharedsource/tabctrl.h"
 
 #include <QTabWidget>
 
@@ -118,7 +119,9 @@ int AddTabPage(QTabWidget &tabs, Page &page, const QString &title)
 {
     if (page.CreateModeless(&tabs) != 1)
         return -1;
-    return tabs.addTab(&page, title);
+    const int index = tabs.addTab(&page, title);
+    FollowTabStrip(tabs, page);
+    return index;
 }
 
 } // namespace sharedsource

@@ -6,6 +6,9 @@
 #include <QTabBar>
 #include <QWheelEvent>
 
+#include <algorithm>
+#include <vector>
+
 namespace sharedsource {
 
 ToTabCtrl::ToTabCtrl(QWidget *parent) : QTabWidget(parent)
@@ -103,6 +106,32 @@ bool ToTabCtrl::eventFilter(QObject *watched, QEvent *event)
         break;
     }
     return QTabWidget::eventFilter(watched, event);
+}
+
+void FollowTabStrip(QTabWidget &tabs, QWidget &page)
+{
+    // The page's controls in their own order, after the strip and after the
+    // pages added before it.
+    QWidget *previous = tabs.tabBar();
+    for (int i = 0; i < tabs.count(); ++i) {
+        QWidget *added = tabs.widget(i);
+        if (added == &page)
+            break;
+        for (QWidget *w = added->nextInFocusChain(); w && added->isAncestorOf(w); w = w->nextInFocusChain())
+            previous = w;
+    }
+    // Each control that takes the focus moves with what lies inside it.
+    std::vector<QWidget *> controls;
+    for (QWidget *w = page.nextInFocusChain(); w && w != &page; w = w->nextInFocusChain()) {
+        const bool inside = std::any_of(controls.begin(), controls.end(),
+                                        [w](const QWidget *control) { return control->isAncestorOf(w); });
+        if (page.isAncestorOf(w) && w->focusPolicy() != Qt::NoFocus && !inside)
+            controls.push_back(w);
+    }
+    for (QWidget *control : controls) {
+        QWidget::setTabOrder(previous, control);
+        previous = control;
+    }
 }
 
 ToTabCtrl *TabCtrlOfPage(const QWidget *page)

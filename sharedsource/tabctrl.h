@@ -44,6 +44,10 @@ private:
     bool m_keyboardSwitching = true;
 };
 
+// Puts the page's controls right after the tab strip (and the pages added
+// before it) in the dialog's focus order, where Tab reaches them from the strip.
+void FollowTabStrip(QTabWidget &tabs, QWidget &page);
+
 // The tab control a page sits in (its stack's parent), or null.
 ToTabCtrl *TabCtrlOfPage(const QWidget *page);
 

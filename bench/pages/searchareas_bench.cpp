@@ -5,10 +5,10 @@
 // The page reads from two views: an in-memory one, which shows what the
 // page itself costs, and the reference library's over its SQLite store
 // (seeded once), with a row that reads the store alone as the page's load
-// does. The store rows run with 1,000 areas only: the reference store
-// checks every new folder against every search area when it commits, so
-// seeding 110,000 folders takes far longer than the run.
+// does. The last row opens the whole properties dialog on that store, as
+// ShowConfigurationDialog does, and closes it again.
 
+#include "configdialog/rovoconfigdlg.h"
 #include "pages/configuredlg.h"
 #include "serverlibs/rovoapilibrary.h"
 #include "serverlibs/searchareas.h"
@@ -248,6 +248,23 @@ void PageReload_MemoryView(benchmark::State &state)
     RunReloads(state, *page, count);
 }
 
+// The properties dialog with the module's pages on the reference store:
+// made, built from its template with every page loaded and shown, then gone.
+void PropertiesDialogOpen_ReferenceStore(benchmark::State &state)
+{
+    const int count = int(state.range(0));
+    Shared().StoreView(count);
+    const WString connection(cv::krn::FromQString(QStringLiteral("<Name>bench%1</Name>").arg(count)));
+    for (auto _ : state) {
+        cv::vek::rovo::configdialog::CROVOConfigDlg dialog(connection, 0);
+        if (dialog.CreateModeless(nullptr) != 1 || dialog.IsErrorMode())
+            state.SkipWithError("the dialog did not open on the store");
+        QApplication::processEvents();
+        dialog.close();
+    }
+    state.SetItemsProcessed(state.iterations() * count * (1 + kExcludedPerArea));
+}
+
 // What the page's load reads from the reference store, without any widget.
 void StoreReadsOnly_ReferenceStore(benchmark::State &state)
 {
@@ -326,8 +343,9 @@ void BareTreeFill(benchmark::State &state)
 BENCHMARK(BareTreeFill)->Arg(1000)->Arg(10000)->Unit(benchmark::kMillisecond);
 BENCHMARK(PageReload_MemoryView)->Arg(1000)->Arg(10000)->Unit(benchmark::kMillisecond);
 BENCHMARK(ListLoadOnly_MemoryView)->Arg(1000)->Arg(10000)->Unit(benchmark::kMillisecond);
-BENCHMARK(PageReload_ReferenceStore)->Arg(1000)->Unit(benchmark::kMillisecond);
-BENCHMARK(StoreReadsOnly_ReferenceStore)->Arg(1000)->Unit(benchmark::kMillisecond);
+BENCHMARK(PageReload_ReferenceStore)->Arg(1000)->Arg(10000)->Unit(benchmark::kMillisecond);
+BENCHMARK(StoreReadsOnly_ReferenceStore)->Arg(1000)->Arg(10000)->Unit(benchmark::kMillisecond);
+BENCHMARK(PropertiesDialogOpen_ReferenceStore)->Arg(1000)->Arg(10000)->Unit(benchmark::kMillisecond);
 
 } // namespace
 

@@ -71,7 +71,26 @@ bool IsInside(const QString &inner, const QString &outer)
 {
     if (inner.isEmpty() || outer.isEmpty())
         return false;
-    return WithSeparator(Key(inner)).startsWith(WithSeparator(Key(outer)));
+    return ContainmentKey(inner).startsWith(ContainmentKey(outer));
+}
+
+QString ContainmentKey(const QString &path)
+{
+    return WithSeparator(Key(path));
+}
+
+std::vector<QString> EnclosingFolders(const QString &path)
+{
+    std::vector<QString> folders;
+    for (qsizetype i = path.size() - 1; i >= 0; --i) {
+        if (path[i] != u'/' && path[i] != u'\\')
+            continue;
+        if (i > 0)
+            folders.push_back(path.left(i));
+        else
+            folders.push_back(path.left(1));
+    }
+    return folders;
 }
 
 void CheckIdleTime(std::uint32_t seconds, std::int32_t code)

@@ -72,6 +72,12 @@ QString Key(const QString &text);
 // True when inner lies inside outer or equals it (both keys or both paths):
 // each is compared with its own separator appended.
 bool IsInside(const QString &inner, const QString &outer);
+// The form IsInside compares: the key with its separator appended. inner
+// lies inside outer exactly when ContainmentKey(outer) starts ContainmentKey(inner).
+QString ContainmentKey(const QString &path);
+// The folders that can contain path, innermost first: path cut at each of
+// its separators (a separator in front stands for the root).
+std::vector<QString> EnclosingFolders(const QString &path);
 
 // Range checks shared by the editor and the configuration file reader.
 // Each raises Failure with code and a text naming the value.

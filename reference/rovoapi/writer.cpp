@@ -75,15 +75,17 @@ void ConfigWriter::AddExcluded(const Folder &folder)
 {
     if (Find(folder.path))
         Bad(status::Conflict, QStringLiteral("%1 is already a search area or an excluded folder").arg(folder.path));
-    // The innermost search area that contains the folder owns it.
+    // The innermost search area that contains the folder owns it. Only the
+    // folder's enclosing folders can be that area: a look-up each, however
+    // many search areas there are.
     std::optional<std::int64_t> owner;
-    qsizetype ownerLength = -1;
-    Statement areas(m_db, "SELECT id, path FROM folders WHERE area_id IS NULL");
-    while (areas.Step()) {
-        const QString areaPath = areas.Text(1);
-        if (IsInside(folder.path, areaPath) && areaPath.size() > ownerLength) {
-            owner = areas.Int(0);
-            ownerLength = areaPath.size();
+    Statement area(m_db, "SELECT id, path FROM folders WHERE path_key = ? AND area_id IS NULL");
+    for (const QString &enclosing : EnclosingFolders(folder.path)) {
+        area.Reset();
+        area.Bind(1, Key(enclosing));
+        if (area.Step() && IsInside(folder.path, area.Text(1))) {
+            owner = area.Int(0);
+            break;
         }
     }
     if (!owner)
@@ -210,16 +212,20 @@ void ConfigWriter::Replace(const Configuration &configuration)
 
 void ConfigWriter::Finish()
 {
-    std::vector<QString> areas;
+    // A search area inside another: in the sorted containment keys a key
+    // that starts with another one follows it, or follows a key that also
+    // starts with it, so comparing neighbours finds every nesting.
+    std::vector<std::pair<QString, QString>> areas; // containment key, path
     Statement select(m_db, "SELECT path FROM folders WHERE area_id IS NULL");
-    while (select.Step())
-        areas.push_back(select.Text(0));
-    for (std::size_t i = 0; i < areas.size(); ++i) {
-        for (std::size_t k = 0; k < areas.size(); ++k) {
-            if (i != k && IsInside(areas[i], areas[k]))
-                Bad(status::Conflict, QStringLiteral("the search area %1 lies inside the search area %2")
-                                          .arg(areas[i], areas[k]));
-        }
+    while (select.Step()) {
+        const QString path = select.Text(0);
+        areas.emplace_back(ContainmentKey(path), path);
+    }
+    std::sort(areas.begin(), areas.end());
+    for (std::size_t i = 1; i < areas.size(); ++i) {
+        if (areas[i].first.startsWith(areas[i - 1].first))
+            Bad(status::Conflict, QStringLiteral("the search area %1 lies inside the search area %2")
+                                      .arg(areas[i].second, areas[i - 1].second));
     }
     Statement excluded(m_db, "SELECT e.path, a.path FROM folders e JOIN folders a ON e.area_id = a.id");
     while (excluded.Step()) {

@@ -98,7 +98,7 @@ TEST_F(PropertiesOnTheStore, WhatTheUserDidOnTheSearchAreasPageIsWhatTheStoreHol
     Add(page, "m"); // absorbs m/inner; its question is answered OK
     QTreeWidgetItem *b = Item(page, QStringLiteral("b"));
     ASSERT_TRUE(page.Tree().EditLabel(b));
-    auto *editor = page.Tree().viewport()->findChild<QLineEdit *>();
+    auto *editor = uitest::LabelEditor(page.Tree());
     ASSERT_NE(editor, nullptr) << "the label editor";
     editor->setText(QStringLiteral("Bee"));
     QTest::keyClick(editor, Qt::Key_Return);

@@ -11,6 +11,7 @@
 #include <QContextMenuEvent>
 #include <QFile>
 #include <QHelpEvent>
+#include <QLineEdit>
 #include <QTest>
 #include <QToolTip>
 
@@ -129,7 +130,9 @@ TEST_F(SearchAreaTree, ChosenEntriesReachThePage)
     EXPECT_EQ(Area(1)->text(0), QStringLiteral("Alpha"));
     MenuByKey(Qt::Key_Menu, Qt::NoModifier, LoadString(Str::RenameMenu));
     EXPECT_TRUE(Tree().IsEditingLabel());
-    QTest::keyClick(QApplication::focusWidget(), Qt::Key_Escape);
+    auto *editor = uitest::LabelEditor(Tree());
+    ASSERT_NE(editor, nullptr) << "the label editor";
+    QTest::keyClick(editor, Qt::Key_Escape);
     EXPECT_FALSE(Tree().IsEditingLabel());
     EXPECT_TRUE(m_host->isVisible());
 

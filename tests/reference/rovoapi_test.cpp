@@ -197,6 +197,37 @@ TEST_F(Store, OrderAndRecordTimeChecks)
     EXPECT_EQ(StatusOf([&](std::int32_t *status) { unknown->CommitConfiguration(status); }), status::NotFound);
 }
 
+TEST_F(Store, NestingIsFoundAmongManyAreasAndExclusionsGoToTheInnermostArea)
+{
+    auto editor = Editor();
+    for (int i = 0; i < 300; ++i)
+        AddArea(editor.get(), (u"/many/" + std::u16string(1, char16_t(u'a' + i % 26)) + U16(std::to_string(i))).c_str(),
+                (u"M" + U16(std::to_string(i))).c_str());
+    AddArea(editor.get(), u"/x/a", u"A");
+    AddArea(editor.get(), u"/x/ab", u"AB"); // a sibling whose name starts like /x/a
+    AddArea(editor.get(), u"D:\\Data", u"Data");
+    Commit(editor.get());
+
+    for (const char16_t *nested : {u"/x/a/b", u"D:\\DATA\\sub", u"/many/c2/deep"}) {
+        auto more = Editor();
+        AddArea(more.get(), nested, u"Nested");
+        EXPECT_EQ(StatusOf([&](std::int32_t *status) { more->CommitConfiguration(status); }), status::Conflict)
+            << Utf8(WString(nested));
+    }
+
+    // While a merge is recorded, an exclusion belongs to the innermost area.
+    auto merge = Editor();
+    AddArea(merge.get(), u"/x", u"X");
+    AddExcluded(merge.get(), u"/x/a/tmp", u"tmp");
+    OkVoid([&](std::int32_t *status) { merge->RemoveFolder(WString(u"/x/a"), 1, status); });
+    OkVoid([&](std::int32_t *status) { merge->RemoveFolder(WString(u"/x/ab"), 1, status); });
+    Commit(merge.get());
+    EXPECT_EQ(Areas().back(), "/x|/x|X") << "the exclusion went with /x/a";
+    AddExcluded(merge.get(), u"/x/keep", u"keep");
+    Commit(merge.get());
+    EXPECT_EQ(Areas().back(), "  /x/keep");
+}
+
 TEST_F(Store, ParseletsDefaultFromTheCatalogueUntilSet)
 {
     auto view = View();

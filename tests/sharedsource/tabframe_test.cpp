@@ -26,7 +26,7 @@ namespace {
 using namespace sharedsource;
 using Lines = std::vector<std::string>;
 
-constexpr int kTabs = 100, kPageEdit = 200, kPageTree = 201;
+constexpr int kTabs = 100, kPageEdit = 200, kPageTree = 201, kPagePlaceholder = 202;
 
 DialogTemplate FrameTemplate()
 {
@@ -52,6 +52,7 @@ DialogTemplate PageTemplate()
     t.fontFace = QStringLiteral("DejaVu Sans Mono");
     t.pointSize = 14;
     t.controls = {
+        {kPagePlaceholder, ControlKind::Placeholder, {}, QRect(200, 2, 30, 10)},
         {kPageEdit, ControlKind::Edit, {}, QRect(10, 10, 100, 12)},
         {kPageTree, ControlKind::Tree, {}, QRect(10, 30, 100, 60)},
     };
@@ -134,7 +135,9 @@ protected:
     GuardedTabs &Tabs() { return m_frame->m_tabs; }
     static void Press(Qt::Key key, Qt::KeyboardModifiers modifiers = Qt::NoModifier)
     {
-        QTest::keyClick(QApplication::focusWidget(), key, modifiers);
+        QWidget *focused = QApplication::focusWidget();
+        ASSERT_NE(focused, nullptr) << "nothing has the keyboard";
+        QTest::keyClick(focused, key, modifiers);
     }
     bool Open() const { return m_frame->isVisible(); }
 
@@ -152,6 +155,17 @@ TEST_F(TabFrame, PagesAreBuiltFromTheirTemplatesWithTheHostFont)
     EXPECT_EQ(page.font().pointSize(), 9);
     EXPECT_EQ(page.Edit().geometry(), DialogUnitsOf(page.font()).ToPixels(QRect(10, 10, 100, 12)));
     EXPECT_FALSE(page.isWindow());
+}
+
+TEST_F(TabFrame, TabGoesFromTheStripIntoThePageAndFromItsEndToTheButtons)
+{
+    Tabs().tabBar()->setFocus();
+    Press(Qt::Key_Tab);
+    EXPECT_EQ(QApplication::focusWidget(), &m_frame->keeping->Edit()) << "the strip leads into the page";
+    Press(Qt::Key_Tab);
+    EXPECT_EQ(QApplication::focusWidget(), &m_frame->keeping->Tree());
+    Press(Qt::Key_Tab);
+    EXPECT_EQ(QApplication::focusWidget(), &GetControl<QWidget>(m_frame.get(), IDOK)) << "past the page's end";
 }
 
 TEST_F(TabFrame, PagesThatKeepEnterAndEscapeLeaveTheDialogOpen)
@@ -186,17 +200,18 @@ TEST_F(TabFrame, EscapeDuringARenameEndsOnlyTheRename)
     item->setFlags(item->flags() | Qt::ItemIsEditable);
     tree.setFocus();
     tree.editItem(item);
-    ASSERT_NE(qobject_cast<QLineEdit *>(QApplication::focusWidget()), nullptr) << "the label editor";
-    QTest::keyClicks(QApplication::focusWidget(), QStringLiteral("X"));
-    Press(Qt::Key_Escape);
+    auto *first = uitest::LabelEditor(tree);
+    ASSERT_NE(first, nullptr) << "the label editor";
+    QTest::keyClicks(first, QStringLiteral("X"));
+    QTest::keyClick(first, Qt::Key_Escape);
     EXPECT_TRUE(Open()) << "Escape went to the label editor";
     EXPECT_EQ(item->text(0), QStringLiteral("Data"));
     tree.editItem(item);
-    auto *editor = qobject_cast<QLineEdit *>(QApplication::focusWidget());
-    ASSERT_NE(editor, nullptr) << QApplication::focusWidget()->metaObject()->className();
+    auto *editor = uitest::LabelEditor(tree);
+    ASSERT_NE(editor, nullptr) << "the label editor";
     editor->selectAll();
     QTest::keyClicks(editor, QStringLiteral("Renamed"));
-    Press(Qt::Key_Return);
+    QTest::keyClick(editor, Qt::Key_Return);
     EXPECT_TRUE(Open()) << "Enter went to the label editor";
     EXPECT_TRUE(QTest::qWaitFor([item] { return item->text(0) == QStringLiteral("Renamed"); })) << "committed";
 }

@@ -57,7 +57,9 @@ protected:
 
     static void Press(Qt::Key key, Qt::KeyboardModifiers modifiers = Qt::NoModifier)
     {
-        QTest::keyClick(QApplication::focusWidget(), key, modifiers);
+        QWidget *focused = QApplication::focusWidget();
+        ASSERT_NE(focused, nullptr) << "nothing has the keyboard";
+        QTest::keyClick(focused, key, modifiers);
     }
     void FocusOn(QWidget *w)
     {

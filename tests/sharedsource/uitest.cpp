@@ -80,6 +80,15 @@ void ExpectLayout(QWidget &dialog, QSize growth, std::initializer_list<EdgeMoves
     }
 }
 
+QLineEdit *LabelEditor(const QAbstractItemView &view)
+{
+    for (QLineEdit *editor : view.viewport()->findChildren<QLineEdit *>()) {
+        if (editor->isVisibleTo(view.viewport()))
+            return editor;
+    }
+    return nullptr;
+}
+
 ModalPoller::ModalPoller(std::chrono::milliseconds watchdog) : m_watchdog(watchdog)
 {
     connect(&m_timer, &QTimer::timeout, this, &ModalPoller::Poll);

@@ -6,7 +6,9 @@
 
 #include "sharedsource/help.h"
 
+#include <QAbstractItemView>
 #include <QApplication>
+#include <QLineEdit>
 #include <QPointer>
 #include <QTimer>
 #include <QWidget>
@@ -89,6 +91,10 @@ struct EdgeMoves
 };
 // Grows dialog by growth and checks every row against the control's rectangle before.
 void ExpectLayout(QWidget &dialog, QSize growth, std::initializer_list<EdgeMoves> rows);
+
+// The in-place editor an item view shows now (an earlier one may linger
+// hidden until it is deleted), or null.
+QLineEdit *LabelEditor(const QAbstractItemView &view);
 
 // Matchers and actions used by most tests.
 template <typename Widget>
