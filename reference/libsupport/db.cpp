@@ -104,6 +104,14 @@ Statement &Statement::Bind(int index, std::int64_t value)
     return *this;
 }
 
+Statement &Statement::BindUtf8(int index, std::string_view text)
+{
+    const int result = sqlite3_bind_text(m_statement, index, text.data(), int(text.size()), SQLITE_STATIC);
+    if (result != SQLITE_OK)
+        m_db.Raise(result, sqlite3_sql(m_statement));
+    return *this;
+}
+
 Statement &Statement::BindNull(int index)
 {
     const int result = sqlite3_bind_null(m_statement, index);
@@ -138,6 +146,12 @@ QString Statement::Text(int column) const
 {
     const auto *text = reinterpret_cast<const char *>(sqlite3_column_text(m_statement, column));
     return text ? QString::fromUtf8(text, sqlite3_column_bytes(m_statement, column)) : QString();
+}
+
+std::string Statement::Utf8(int column) const
+{
+    const auto *text = reinterpret_cast<const char *>(sqlite3_column_text(m_statement, column));
+    return text ? std::string(text, std::size_t(sqlite3_column_bytes(m_statement, column))) : std::string();
 }
 
 std::int64_t Statement::Int(int column) const

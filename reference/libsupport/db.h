@@ -9,6 +9,8 @@
 #include <cstdint>
 #include <memory>
 #include <mutex>
+#include <string>
+#include <string_view>
 
 struct sqlite3;
 struct sqlite3_stmt;
@@ -28,6 +30,9 @@ public:
     Statement &Bind(int index, const QString &text);
     Statement &Bind(int index, std::int64_t value);
     Statement &BindNull(int index);
+    // UTF-8 (or any bytes) as text, without a copy: they must stay as they
+    // are until the statement has been stepped.
+    Statement &BindUtf8(int index, std::string_view text);
     // True while a row is available.
     bool Step();
     // Runs a statement that returns no rows.
@@ -35,6 +40,7 @@ public:
     void Reset();
 
     QString Text(int column) const;
+    std::string Utf8(int column) const;
     std::int64_t Int(int column) const;
     bool IsNull(int column) const;
 

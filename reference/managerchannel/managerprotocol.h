@@ -51,6 +51,26 @@ inline constexpr QLatin1String ResetTimeoutFiles("reset-timeout-files");
 inline constexpr QLatin1String ResetFailedFiles("reset-failed-files");
 // kind (1 browse and connection, 2 query), milliseconds
 inline constexpr QLatin1String SetServiceTimeout("set-service-timeout");
+
+// The indexer and the property side of the index. A level is one of the
+// keys "sorvik_root", "qdm_channelgroup", "qdm_channel" (case ignored);
+// another is answered with NotFound.
+// -> done, total (equal unless indexing runs), time (ms since 1970 of the
+//    last progress; absent before any), passes (completed since the start),
+//    running, pending (indexing is due once the idle time has passed)
+inline constexpr QLatin1String IndexingProgress("indexing-progress");
+// -> levels: [{name, key, displayNames: {language: text}}]
+inline constexpr QLatin1String PropertyModel("property-model");
+// level -> properties: [{name, occurrences}] by name
+inline constexpr QLatin1String LevelProperties("level-properties");
+// level -> the server counts the level's occurrences anew, in the background
+inline constexpr QLatin1String CountOccurrences("count-occurrences");
+// level -> counting (true until the count asked for has ended)
+inline constexpr QLatin1String CountingOccurrences("counting-occurrences");
+// level, property -> state (101 when it is not optimized)
+inline constexpr QLatin1String OptimizationState("optimization-state");
+// level -> properties: [{name, state}] by name, also those no longer indexed
+inline constexpr QLatin1String OptimizedProperties("optimized-properties");
 } // namespace op
 
 namespace field {
@@ -66,6 +86,31 @@ inline constexpr QLatin1String Waiting("waiting");
 inline constexpr QLatin1String ApplyDelayMs("applyDelayMs");
 inline constexpr QLatin1String Kind("kind");
 inline constexpr QLatin1String Milliseconds("milliseconds");
+inline constexpr QLatin1String Done("done");
+inline constexpr QLatin1String Total("total");
+inline constexpr QLatin1String Time("time");
+inline constexpr QLatin1String Passes("passes");
+inline constexpr QLatin1String Running("running");
+inline constexpr QLatin1String Pending("pending");
+inline constexpr QLatin1String Levels("levels");
+inline constexpr QLatin1String Name("name");
+inline constexpr QLatin1String Key("key");
+inline constexpr QLatin1String DisplayNames("displayNames");
+inline constexpr QLatin1String Level("level");
+inline constexpr QLatin1String Property("property");
+inline constexpr QLatin1String Properties("properties");
+inline constexpr QLatin1String Occurrences("occurrences");
+inline constexpr QLatin1String State("state");
+inline constexpr QLatin1String Counting("counting");
 } // namespace field
+
+// The requests the configuration store carries for the server
+// (rovo::AddRequest) about optimized properties; the argument is a JSON
+// object {"level": key, "property": name, "state": state} (no state for
+// unoptimize-property).
+namespace request {
+inline constexpr QLatin1String OptimizeProperty("optimize-property");
+inline constexpr QLatin1String UnoptimizeProperty("unoptimize-property");
+} // namespace request
 
 } // namespace sorvik::manager

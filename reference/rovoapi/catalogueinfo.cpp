@@ -5,6 +5,8 @@
 #include "sorvik/rovoapi.h"
 #include "sorvik/wstringqt.h"
 
+#include <algorithm>
+
 namespace sorvik::rovo {
 
 namespace {
@@ -53,6 +55,28 @@ const ParseletInfo &CatalogueInfo::Require(const QString &name, std::int32_t cod
     if (!found)
         ref::Fail(code, QStringLiteral("there is no Parselet \"%1\"").arg(name).toStdU16String());
     return *found;
+}
+
+std::vector<const ParseletInfo *> ExtensionParselets(const CatalogueInfo &catalogue, const QString &extensionKey,
+                                                     const std::vector<QString> &explicitOrder,
+                                                     const std::function<bool(const ParseletInfo &)> &isActive)
+{
+    std::vector<const ParseletInfo *> order;
+    for (const QString &name : explicitOrder) {
+        const ParseletInfo *parselet = catalogue.Find(name);
+        if (parselet && std::find(order.begin(), order.end(), parselet) == order.end())
+            order.push_back(parselet);
+    }
+    for (const ParseletInfo &parselet : catalogue.parselets) {
+        if (std::find(order.begin(), order.end(), &parselet) == order.end())
+            order.push_back(&parselet);
+    }
+    std::vector<const ParseletInfo *> result;
+    for (const ParseletInfo *parselet : order) {
+        if (parselet->Reads(extensionKey) && isActive(*parselet))
+            result.push_back(parselet);
+    }
+    return result;
 }
 
 std::shared_ptr<const CatalogueInfo> ReadCatalogueInfo(cv::vekex::IEnvironment *dataStore)

@@ -7,6 +7,7 @@
 
 #include <QString>
 
+#include <functional>
 #include <memory>
 #include <vector>
 
@@ -33,6 +34,14 @@ struct CatalogueInfo
     // The Parselet's catalogue spelling; NotFound (or code) for an unknown name.
     const ParseletInfo &Require(const QString &name, std::int32_t code) const;
 };
+
+// The active Parselets reading extensionKey (case folded, without "*."),
+// highest priority first: those named in explicitOrder in that order, then
+// the others in catalogue order. The configuration view answers with it and
+// the server indexes by it, so both always agree.
+std::vector<const ParseletInfo *> ExtensionParselets(const CatalogueInfo &catalogue, const QString &extensionKey,
+                                                     const std::vector<QString> &explicitOrder,
+                                                     const std::function<bool(const ParseletInfo &)> &isActive);
 
 // Raises CatalogueFailed with the data-store library's explanation.
 std::shared_ptr<const CatalogueInfo> ReadCatalogueInfo(cv::vekex::IEnvironment *dataStore);

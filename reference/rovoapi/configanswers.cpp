@@ -1,7 +1,5 @@
 #include "reference/rovoapi/configanswers.h"
 
-#include <algorithm>
-
 namespace sorvik::rovo {
 
 std::vector<QString> ConfigAnswers::SearchAreas() const
@@ -67,24 +65,15 @@ bool ConfigAnswers::IsActive(const ParseletInfo &parselet) const
 
 std::vector<QString> ConfigAnswers::ExtensionParselets(const QString &extensionKey) const
 {
-    std::vector<const ParseletInfo *> order;
+    std::vector<QString> explicitOrder;
     for (const ExtensionPriority &priority : m_configuration.priorities) {
-        if (Key(priority.extension) != extensionKey)
-            continue;
-        for (const QString &name : priority.parselets) {
-            if (const ParseletInfo *parselet = m_catalogue.Find(name))
-                order.push_back(parselet);
-        }
-    }
-    for (const ParseletInfo &parselet : m_catalogue.parselets) {
-        if (std::find(order.begin(), order.end(), &parselet) == order.end())
-            order.push_back(&parselet);
+        if (Key(priority.extension) == extensionKey)
+            explicitOrder.insert(explicitOrder.end(), priority.parselets.begin(), priority.parselets.end());
     }
     std::vector<QString> names;
-    for (const ParseletInfo *parselet : order) {
-        if (parselet->Reads(extensionKey) && IsActive(*parselet))
-            names.push_back(parselet->name);
-    }
+    for (const ParseletInfo *parselet : rovo::ExtensionParselets(m_catalogue, extensionKey, explicitOrder,
+                                                                 [this](const ParseletInfo &p) { return IsActive(p); }))
+        names.push_back(parselet->name);
     return names;
 }
 

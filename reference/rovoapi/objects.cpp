@@ -643,23 +643,15 @@ public:
             const auto catalogue = m_context->Catalogue();
             std::lock_guard guard(m_db->Lock());
             Transaction read(*m_db, Transaction::Kind::Read, status::StoreUnavailable);
-            std::vector<const ParseletInfo *> order;
-            Statement explicitOrder(*m_db, "SELECT parselet FROM extension_priorities WHERE extension = ? ORDER BY rank");
-            explicitOrder.Bind(1, key);
-            while (explicitOrder.Step()) {
-                if (const ParseletInfo *parselet = catalogue->Find(explicitOrder.Text(0)))
-                    order.push_back(parselet);
-            }
-            // Readers without an explicit place follow in catalogue order.
-            for (const ParseletInfo &parselet : catalogue->parselets) {
-                if (std::find(order.begin(), order.end(), &parselet) == order.end())
-                    order.push_back(&parselet);
-            }
+            std::vector<QString> explicitOrder;
+            Statement select(*m_db, "SELECT parselet FROM extension_priorities WHERE extension = ? ORDER BY rank");
+            select.Bind(1, key);
+            while (select.Step())
+                explicitOrder.push_back(select.Text(0));
             std::vector<WString> names;
-            for (const ParseletInfo *parselet : order) {
-                if (parselet->Reads(key) && Active(*parselet))
-                    names.push_back(FromQString(parselet->name));
-            }
+            for (const ParseletInfo *parselet : ExtensionParselets(*catalogue, key, explicitOrder,
+                                                                   [this](const ParseletInfo &p) { return Active(p); }))
+                names.push_back(FromQString(parselet->name));
             return new ref::StringList(std::move(names));
         });
     }

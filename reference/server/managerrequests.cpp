@@ -6,6 +6,7 @@
 #include "sorvik/rovoapi.h"
 
 #include <QFileInfo>
+#include <QJsonArray>
 
 #include <cstdio>
 
@@ -19,12 +20,26 @@ using namespace manager;
 // The longest service time-out the configuration can hold: 9999 s.
 constexpr std::int64_t kMaxServiceTimeoutMs = 9999000;
 
+// The level a request names; raises NotFound for anything else.
+int LevelOf(const QJsonObject &request)
+{
+    const QString key = request.value(field::Level).toString();
+    const auto level = LevelOfKey(key);
+    if (!level)
+        ref::Fail(status::NotFound, QStringLiteral("there is no property level \"%1\" (levels: sorvik_root, "
+                                                   "qdm_channelgroup, qdm_channel)")
+                                        .arg(key)
+                                        .toStdU16String());
+    return *level;
+}
+
 } // namespace
 
 ManagerRequests::ManagerRequests(const ServerOptions &options, QString storeFile, IndexStatus &status,
-                                 ConfigApplier &applier, ServiceTimeouts &timeouts)
+                                 ConfigApplier &applier, ServiceTimeouts &timeouts, Indexer &indexer,
+                                 PropertyIndex &properties)
     : m_options(options), m_storeFile(std::move(storeFile)), m_status(status), m_applier(applier),
-      m_timeouts(timeouts)
+      m_timeouts(timeouts), m_indexer(indexer), m_properties(properties)
 {
 }
 
@@ -44,6 +59,20 @@ std::optional<QJsonObject> ManagerRequests::Handle(const QJsonObject &request, s
             return ResetFailedFiles(request);
         if (op == op::SetServiceTimeout)
             return SetServiceTimeout(request);
+        if (op == op::IndexingProgress)
+            return IndexingProgress(request);
+        if (op == op::PropertyModel)
+            return PropertyModel(request);
+        if (op == op::LevelProperties)
+            return LevelProperties(request);
+        if (op == op::CountOccurrences)
+            return CountOccurrences(request);
+        if (op == op::CountingOccurrences)
+            return CountingOccurrences(request);
+        if (op == op::OptimizationState)
+            return OptimizationState(request);
+        if (op == op::OptimizedProperties)
+            return OptimizedProperties(request);
     } catch (const ref::Failure &failure) {
         return Answer(failure.code, QString::fromStdU16String(failure.text));
     }
@@ -118,6 +147,79 @@ QJsonObject ManagerRequests::SetServiceTimeout(const QJsonObject &request)
     std::printf("service timeout %s: %u ms\n", *kind == 1 ? "browse" : "query", unsigned(*milliseconds));
     std::fflush(stdout);
     return Answer(0);
+}
+
+QJsonObject ManagerRequests::IndexingProgress(const QJsonObject &)
+{
+    const Indexer::State state = m_indexer.GetState();
+    QJsonObject answer = Answer(0);
+    answer.insert(field::Done, qint64(state.done));
+    answer.insert(field::Total, qint64(state.total));
+    if (state.lastMs >= 0)
+        answer.insert(field::Time, qint64(state.lastMs));
+    answer.insert(field::Passes, qint64(state.passes));
+    answer.insert(field::Running, state.running);
+    answer.insert(field::Pending, state.pending);
+    return answer;
+}
+
+QJsonObject ManagerRequests::PropertyModel(const QJsonObject &)
+{
+    QJsonArray levels;
+    for (const PropertyLevel &level : kPropertyLevels) {
+        levels.append(QJsonObject{{field::Name, QLatin1String(level.name)},
+                                  {field::Key, QLatin1String(level.key)},
+                                  {field::DisplayNames, QJsonObject{{QLatin1String("eng"), QLatin1String(level.displayName)}}}});
+    }
+    QJsonObject answer = Answer(0);
+    answer.insert(field::Levels, levels);
+    return answer;
+}
+
+QJsonObject ManagerRequests::LevelProperties(const QJsonObject &request)
+{
+    QJsonArray properties;
+    for (const LevelProperty &property : m_properties.Properties(LevelOf(request)))
+        properties.append(QJsonObject{{field::Name, property.name}, {field::Occurrences, qint64(property.occurrences)}});
+    QJsonObject answer = Answer(0);
+    answer.insert(field::Properties, properties);
+    return answer;
+}
+
+QJsonObject ManagerRequests::CountOccurrences(const QJsonObject &request)
+{
+    m_properties.StartOccurrenceCount(LevelOf(request));
+    QJsonObject answer = Answer(0);
+    answer.insert(field::Counting, true);
+    return answer;
+}
+
+QJsonObject ManagerRequests::CountingOccurrences(const QJsonObject &request)
+{
+    QJsonObject answer = Answer(0);
+    answer.insert(field::Counting, m_properties.IsCounting(LevelOf(request)));
+    return answer;
+}
+
+QJsonObject ManagerRequests::OptimizationState(const QJsonObject &request)
+{
+    const int level = LevelOf(request);
+    const QJsonValue property = request.value(field::Property);
+    if (!property.isString())
+        return Answer(status::InvalidArgument, QStringLiteral("optimization-state needs a property name"));
+    QJsonObject answer = Answer(0);
+    answer.insert(field::State, qint64(m_properties.OptimizationState(level, property.toString())));
+    return answer;
+}
+
+QJsonObject ManagerRequests::OptimizedProperties(const QJsonObject &request)
+{
+    QJsonArray properties;
+    for (const auto &[name, state] : m_properties.OptimizedProperties(LevelOf(request)))
+        properties.append(QJsonObject{{field::Name, name}, {field::State, qint64(state)}});
+    QJsonObject answer = Answer(0);
+    answer.insert(field::Properties, properties);
+    return answer;
 }
 
 } // namespace sorvik::server

@@ -1,7 +1,9 @@
 #pragma once
 
 #include "reference/server/configapplier.h"
+#include "reference/server/indexer.h"
 #include "reference/server/indexstatus.h"
+#include "reference/server/propertyindex.h"
 #include "reference/server/serveroptions.h"
 #include "reference/server/servicetimeouts.h"
 
@@ -20,7 +22,7 @@ class ManagerRequests
 {
 public:
     ManagerRequests(const ServerOptions &options, QString storeFile, IndexStatus &status, ConfigApplier &applier,
-                    ServiceTimeouts &timeouts);
+                    ServiceTimeouts &timeouts, Indexer &indexer, PropertyIndex &properties);
 
     // The answer; nothing when a wait was cancelled through one of the
     // descriptors (the client went, or the server stops), which ends the
@@ -34,12 +36,21 @@ private:
     QJsonObject ResetTimeoutFiles(const QJsonObject &request);
     QJsonObject ResetFailedFiles(const QJsonObject &request);
     QJsonObject SetServiceTimeout(const QJsonObject &request);
+    QJsonObject IndexingProgress(const QJsonObject &request);
+    QJsonObject PropertyModel(const QJsonObject &request);
+    QJsonObject LevelProperties(const QJsonObject &request);
+    QJsonObject CountOccurrences(const QJsonObject &request);
+    QJsonObject CountingOccurrences(const QJsonObject &request);
+    QJsonObject OptimizationState(const QJsonObject &request);
+    QJsonObject OptimizedProperties(const QJsonObject &request);
 
     const ServerOptions &m_options;
     const QString m_storeFile;
     IndexStatus &m_status;
     ConfigApplier &m_applier;
     ServiceTimeouts &m_timeouts;
+    Indexer &m_indexer;
+    PropertyIndex &m_properties;
 };
 
 } // namespace sorvik::server

@@ -6,18 +6,30 @@
 #include "sorvik/rovocomm.h"
 #include "reference/libsupport/refobject.h"
 #include "reference/rovoapi/store.h"
+#include "reference/managerchannel/managermessage.h"
+#include "reference/managerchannel/managerprotocol.h"
 #include "reference/server/configapplier.h"
+#include "reference/server/datastore.h"
+#include "reference/server/indexer.h"
+#include "reference/server/indexplan.h"
+#include "reference/server/indexrecords.h"
 #include "reference/server/indexstatus.h"
+#include "reference/server/propertyindex.h"
 #include "reference/server/logonacceptor.h"
 #include "reference/server/managerchannel.h"
 #include "reference/server/managerrequests.h"
 #include "reference/server/protocolsession.h"
 #include "reference/server/servicetimeouts.h"
 
+#include <QDir>
+#include <QFile>
+#include <QJsonDocument>
+#include <QJsonObject>
 #include <QString>
 
 #include <cstdio>
 #include <list>
+#include <optional>
 
 #include <poll.h>
 #include <sys/eventfd.h>
@@ -93,24 +105,58 @@ void Announce(const char *format, long long value)
     std::fflush(stdout);
 }
 
-// What the server does with a configuration it takes up.
-void TakeUp(ServiceTimeouts &timeouts, IndexStatus &status, const CommittedConfiguration &committed)
+void Report(const QString &text)
 {
-    const rovo::Settings &settings = committed.configuration.settings;
-    timeouts.TakeUp(settings.browseTimeout, settings.queryTimeout);
-    for (const rovo::StoreRequest &request : committed.requests) {
-        if (request.kind == u"reset-index")
-            status.ResetIndex();
-    }
-    const std::int64_t lastRequest =
-        committed.requests.empty() ? status.AppliedRequest() : committed.requests.back().id;
-    status.RecordApplied(committed.generation, lastRequest);
-    Announce("applied configuration %lld\n", committed.generation);
+    std::fprintf(stderr, "Sorvik: %s\n", text.toLocal8Bit().constData());
 }
 
-[[noreturn]] void Unusable(const char *what, const ref::Failure &failure)
+// Where the server last kept the index of its Sorvik, so that it can follow
+// an index location changed while it did not run.
+QString LocationFile(const QString &storeFile)
 {
-    throw std::runtime_error(std::string(what) + ": " + QString::fromStdU16String(failure.text).toStdString());
+    return storeFile + QStringLiteral("-indexlocation");
+}
+
+QString RememberedLocation(const QString &storeFile)
+{
+    QFile file(LocationFile(storeFile));
+    if (!file.open(QIODevice::ReadOnly))
+        return {};
+    return QFile::decodeName(file.readAll().trimmed());
+}
+
+void RememberLocation(const QString &storeFile, const QString &folder)
+{
+    QFile file(LocationFile(storeFile));
+    if (file.open(QIODevice::WriteOnly | QIODevice::Truncate))
+        file.write(QFile::encodeName(folder) + '\n');
+}
+
+bool SameFolder(const QString &a, const QString &b)
+{
+    return QDir::cleanPath(QDir(a).absolutePath()) == QDir::cleanPath(QDir(b).absolutePath());
+}
+
+// Opens the index in the committed folder; an index the server kept
+// elsewhere before the folder was changed moves there first.
+std::unique_ptr<IndexStatus> OpenIndex(const QString &storeFile, const QString &committedFolder)
+{
+    const QString remembered = RememberedLocation(storeFile);
+    if (!remembered.isEmpty() && !SameFolder(remembered, committedFolder) &&
+        QFile::exists(IndexStatus::FileIn(remembered)) && !QFile::exists(IndexStatus::FileIn(committedFolder))) {
+        auto status = std::make_unique<IndexStatus>(remembered);
+        try {
+            status->MoveTo(committedFolder);
+        } catch (const ref::Failure &failure) {
+            Report(QStringLiteral("cannot move the index to %1: %2")
+                       .arg(committedFolder, QString::fromStdU16String(failure.text)));
+        }
+        RememberLocation(storeFile, status->Folder());
+        return status;
+    }
+    auto status = std::make_unique<IndexStatus>(committedFolder);
+    RememberLocation(storeFile, status->Folder());
+    return status;
 }
 
 } // namespace
@@ -118,12 +164,18 @@ void TakeUp(ServiceTimeouts &timeouts, IndexStatus &status, const CommittedConfi
 struct Server::State
 {
     ServerOptions options;
+    QString storeFile;
     std::unique_ptr<cv::krn::osdep::Mutex> globalMutex;
     std::unique_ptr<cv::krn::osdep::Mutex> instanceMutex;
     std::unique_ptr<IndexStatus> status;
     // Declared in the order they are needed; they go in reverse, so the
-    // threads of the channel and the applier end before what they use.
+    // threads of the channel, the applier and the indexer end before what
+    // they use.
     ServiceTimeouts timeouts;
+    std::unique_ptr<DataStore> dataStore;                 // null when the library cannot be loaded
+    std::shared_ptr<const rovo::CatalogueInfo> catalogue; // the last one read
+    std::unique_ptr<PropertyIndex> properties;
+    std::unique_ptr<Indexer> indexer;
     std::unique_ptr<ConfigApplier> applier;
     std::unique_ptr<ManagerRequests> managerRequests;
     std::unique_ptr<ManagerChannel> manager;
@@ -138,7 +190,114 @@ struct Server::State
         if (stopEvent >= 0)
             ::close(stopEvent);
     }
+
+    void TakeUp(const CommittedConfiguration &committed);
+
+private:
+    bool DoRequest(const rovo::StoreRequest &request);
+    void ChangeOptimization(const rovo::StoreRequest &request);
+    void FollowIndexLocation(const QString &folder);
+    const rovo::CatalogueInfo *Catalogue();
 };
+
+// What the server does with a configuration it takes up.
+void Server::State::TakeUp(const CommittedConfiguration &committed)
+{
+    const rovo::Settings &settings = committed.configuration.settings;
+    timeouts.TakeUp(settings.browseTimeout, settings.queryTimeout);
+    bool indexAgain = false;
+    for (const rovo::StoreRequest &request : committed.requests)
+        indexAgain = DoRequest(request) || indexAgain;
+    // An index that cannot move stays where it is and goes on indexing what
+    // this configuration says; the waiting clients learn why.
+    std::optional<ref::Failure> notMoved;
+    try {
+        FollowIndexLocation(settings.indexPath);
+    } catch (const ref::Failure &failure) {
+        notMoved = failure;
+    }
+    // Without a catalogue the server cannot tell what reads a file, and
+    // leaves the index as it is rather than empty it.
+    if (const rovo::CatalogueInfo *parselets = Catalogue())
+        indexer->TakeUp(MakePlan(committed.configuration, *parselets), IndexerSettingsOf(settings), indexAgain);
+    const std::int64_t lastRequest =
+        committed.requests.empty() ? status->AppliedRequest() : committed.requests.back().id;
+    status->RecordApplied(committed.generation, lastRequest);
+    Announce("applied configuration %lld\n", committed.generation);
+    if (notMoved)
+        throw *notMoved;
+}
+
+// True when the request asks for indexing.
+bool Server::State::DoRequest(const rovo::StoreRequest &request)
+{
+    if (request.kind == u"reset-index") {
+        status->ResetIndex(request.argument == QString::number(cv::rovo::kResetIndexAndConfiguration));
+        indexer->AbortPass();
+        return true;
+    }
+    if (request.kind == u"start-indexing")
+        return true;
+    if (request.kind == u"reindex-parselet") {
+        IndexRecords(*status).MarkForReading(request.argument);
+        return true;
+    }
+    if (request.kind == manager::request::OptimizeProperty || request.kind == manager::request::UnoptimizeProperty)
+        ChangeOptimization(request);
+    // move-index: the index follows the committed index folder.
+    return false;
+}
+
+void Server::State::ChangeOptimization(const rovo::StoreRequest &request)
+{
+    const QJsonObject change = QJsonDocument::fromJson(request.argument.toUtf8()).object();
+    const auto level = LevelOfKey(change.value(manager::field::Level).toString());
+    const QString name = change.value(manager::field::Property).toString();
+    const auto state = manager::IntegerField(change, manager::field::State, 0, UINT16_MAX);
+    const bool optimize = request.kind == manager::request::OptimizeProperty;
+    if (!level || name.isEmpty() || (optimize && !state)) {
+        Report(QStringLiteral("request %1 is not a change of an optimized property: %2").arg(request.id).arg(request.argument));
+        return;
+    }
+    if (optimize)
+        properties->Optimize(*level, name, std::uint32_t(*state));
+    else
+        properties->Unoptimize(*level, name);
+}
+
+void Server::State::FollowIndexLocation(const QString &folder)
+{
+    if (folder.isEmpty() || SameFolder(folder, status->Folder()))
+        return;
+    status->MoveTo(folder);
+    RememberLocation(storeFile, status->Folder());
+    std::printf("index moved to %s\n", QFile::encodeName(status->Folder()).constData());
+    std::fflush(stdout);
+}
+
+// The catalogue as the data-store library has it now; when it cannot be
+// read, the last one read, so that a passing failure does not empty the
+// index; null when there has never been one.
+const rovo::CatalogueInfo *Server::State::Catalogue()
+{
+    if (dataStore) {
+        try {
+            catalogue = dataStore->Catalogue();
+        } catch (const ref::Failure &failure) {
+            Report(QStringLiteral("cannot read the Parselet catalogue: %1").arg(QString::fromStdU16String(failure.text)));
+        }
+    }
+    return catalogue.get();
+}
+
+namespace {
+
+[[noreturn]] void Unusable(const char *what, const ref::Failure &failure)
+{
+    throw std::runtime_error(std::string(what) + ": " + QString::fromStdU16String(failure.text).toStdString());
+}
+
+} // namespace
 
 Server::Server(ServerOptions options, AcceptorFactory makeKerberosAcceptor) : m_state(std::make_unique<State>())
 {
@@ -157,31 +316,41 @@ Server::Server(ServerOptions options, AcceptorFactory makeKerberosAcceptor) : m_
     state.instanceMutex = Hold(cv::vek::rovo::dunemere::InstanceMutexName(portName), "instance mutex");
 
     // The Sorvik of this instance: the local one, or the one named like the port.
-    const QString storeFile = rovo::StoreFile(QString::fromStdU16String(portName));
+    state.storeFile = rovo::StoreFile(QString::fromStdU16String(portName));
     try {
         state.applier = std::make_unique<ConfigApplier>(
-            storeFile, std::chrono::milliseconds(state.options.applyDelayMs));
+            state.storeFile, std::chrono::milliseconds(state.options.applyDelayMs));
     } catch (const ref::Failure &failure) {
         Unusable("cannot read the configuration", failure);
     }
     try {
-        state.status = std::make_unique<IndexStatus>(state.applier->CommittedSettings().indexPath);
+        state.status = OpenIndex(state.storeFile, state.applier->CommittedSettings().indexPath);
     } catch (const ref::Failure &failure) {
         Unusable("cannot open the index status", failure);
     }
     try {
+        state.dataStore = std::make_unique<DataStore>();
+    } catch (const std::exception &failure) {
+        Report(QStringLiteral("cannot index without the Parselet catalogue: %1").arg(QString::fromLocal8Bit(failure.what())));
+    }
+    state.properties = std::make_unique<PropertyIndex>(*state.status);
+    std::optional<std::chrono::seconds> idleOverride;
+    if (state.options.idleSeconds)
+        idleOverride = std::chrono::seconds(*state.options.idleSeconds);
+    state.indexer = std::make_unique<Indexer>(*state.status, idleOverride);
+    try {
         state.applier->Start(state.status->AppliedRequest(),
-                             [&state](const CommittedConfiguration &committed) {
-                                 TakeUp(state.timeouts, *state.status, committed);
-                             });
+                             [&state](const CommittedConfiguration &committed) { state.TakeUp(committed); });
     } catch (const ref::Failure &failure) {
         Unusable("cannot take up the configuration", failure);
     }
+    state.indexer->Start();
 
     // The manager channel listens before the client service, so a client
     // that finds the service finds the index manager too.
-    state.managerRequests =
-        std::make_unique<ManagerRequests>(state.options, storeFile, *state.status, *state.applier, state.timeouts);
+    state.managerRequests = std::make_unique<ManagerRequests>(state.options, state.storeFile, *state.status,
+                                                              *state.applier, state.timeouts, *state.indexer,
+                                                              *state.properties);
     state.manager = std::make_unique<ManagerChannel>(portName, *state.managerRequests);
     state.manager->Start();
 
@@ -242,6 +411,8 @@ void Server::Run(const std::atomic<bool> &stop)
         connection.thread.join();
     state.manager->Stop();
     state.applier->Stop();
+    state.indexer->Stop();
+    state.properties->Stop();
 }
 
 } // namespace sorvik::server

@@ -28,6 +28,8 @@ std::optional<std::uint32_t> ParseField(std::string_view text, std::uint32_t lim
 
 // A day is far more than any test or demonstration needs.
 constexpr std::uint32_t kMaxApplyDelayMs = 86400000;
+// The configuration's own limit of the idle time.
+constexpr std::uint32_t kMaxIdleSeconds = 9999;
 
 } // namespace
 
@@ -73,7 +75,7 @@ std::optional<ServerOptions> ParseServerOptions(int argc, char **argv, std::stri
         }
         if (option != "--portname" && option != "--version" && option != "--identification" &&
             option != "--secretkey" && option != "--keytab" && option != "--principal" && option != "--store" &&
-            option != "--client-target" && option != "--apply-delay-ms") {
+            option != "--client-target" && option != "--apply-delay-ms" && option != "--idle-seconds") {
             error = "unknown option " + std::string(option);
             return std::nullopt;
         }
@@ -107,6 +109,14 @@ std::optional<ServerOptions> ParseServerOptions(int argc, char **argv, std::stri
                 return std::nullopt;
             }
             options.applyDelayMs = *delay;
+        } else if (option == "--idle-seconds") {
+            const auto idle = ParseField(*text, kMaxIdleSeconds);
+            if (!idle) {
+                error = "--idle-seconds wants seconds from 0 to " + std::to_string(kMaxIdleSeconds) + ", got " +
+                        std::string(*text);
+                return std::nullopt;
+            }
+            options.idleSeconds = *idle;
         } else {
             options.store = std::string(*text);
         }

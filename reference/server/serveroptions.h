@@ -12,7 +12,7 @@ namespace sorvik::server {
 //          [--identification TEXT --secretkey KEY]
 //          [--keytab FILE --principal NAME] [--require-authentication]
 //          [--client-target NAME] [--skip-mutual-authentication]
-//          [--store DIR] [--apply-delay-ms N]
+//          [--store DIR] [--apply-delay-ms N] [--idle-seconds N]
 struct ServerOptions
 {
     // Empty: the default local server, which also holds the global mutex.
@@ -38,6 +38,9 @@ struct ServerOptions
     // How long taking up each committed configuration takes (for showing and
     // testing slow servers).
     std::uint32_t applyDelayMs = 0;
+    // Replaces the configured idle time before indexing (for demonstrations
+    // and tests that cannot wait for it).
+    std::optional<std::uint32_t> idleSeconds;
 
     bool RequiresAuthentication() const { return requireAuthentication || !keytab.empty(); }
     bool ChecksClientProof() const { return !identification.empty(); }

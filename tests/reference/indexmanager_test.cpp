@@ -338,25 +338,33 @@ TEST_F(IndexManagerTest, AResetIsTakenUpOnceWhetherTheServerRunsOrNot)
     EXPECT_EQ(StatusValue("SELECT count(*) FROM element_counts"), 0) << "a reset made while no server ran";
 }
 
-TEST_F(IndexManagerTest, WhatTheServerDoesNotOfferFailsWithUnsupported)
+TEST_F(IndexManagerTest, ThePropertySideIsOfferedForItsThreeLevelsOnly)
 {
     auto server = Start({"--portname", "P"}, "P");
     auto manager = Manager(Open(u"<PortName>P</PortName>").get());
     ASSERT_TRUE(manager);
+    for (const char16_t *level : {u"sorvik_root", u"qdm_channelgroup", u"qdm_channel"}) {
+        auto list = RefPtr<cv::rovo::ILevelPropertyList>::Adopt(
+            Ok([&](std::int32_t *status) { return manager->GetLevelProperties(WString(level), status); }));
+        ASSERT_TRUE(list);
+        OkVoid([&](std::int32_t *status) { list->Fetch(status); });
+        EXPECT_EQ(Ok([&](std::int32_t *status) { return list->GetCount(status); }), 0u) << "nothing is indexed";
+    }
     std::int32_t result = 0;
     EXPECT_EQ(manager->GetLevelProperties(WString(u"file"), &result), nullptr);
-    EXPECT_EQ(result, status::Unsupported);
+    EXPECT_EQ(result, status::NotFound);
+    EXPECT_TRUE(RefPtr<cv::rovo::IOptimizationEditor>::Adopt(
+        Ok([&](std::int32_t *status) { return manager->GetOptimizationEditor(status); })));
+    auto index = RefPtr<cv::rovo::IIndexStatus>::Adopt(Ok([&](std::int32_t *status) { return manager->GetIndexStatus(status); }));
+    ASSERT_TRUE(index);
+    std::uint32_t state = 0;
     result = 0;
-    EXPECT_EQ(manager->GetOptimizationEditor(&result), nullptr);
-    EXPECT_EQ(result, status::Unsupported);
-    result = 0;
-    EXPECT_EQ(manager->GetIndexStatus(&result), nullptr);
-    EXPECT_EQ(result, status::Unsupported);
+    index->GetOptimizationState(WString(u"channel"), WString(u"unit"), &state, &result);
+    EXPECT_EQ(result, status::NotFound);
     auto context = RefPtr<cv::rovo::IServerContext>::Adopt(
         Ok([&](std::int32_t *status) { return manager->GetServerContext(status); }));
-    result = 0;
-    EXPECT_EQ(context->GetPropertyModel(&result), nullptr);
-    EXPECT_EQ(result, status::Unsupported);
+    EXPECT_TRUE(RefPtr<cv::rovo::IPropertyModel>::Adopt(
+        Ok([&](std::int32_t *status) { return context->GetPropertyModel(status); })));
 }
 
 // Writes raw bytes to the instance's manager socket.
