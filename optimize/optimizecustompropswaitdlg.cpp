@@ -16,7 +16,6 @@ COptimizeCustomPropsWaitDlg::COptimizeCustomPropsWaitDlg(krn::RefPtr<cv::rovo::I
       m_title(title),
       m_entry(*this)
 {
-    setAttribute(Qt::WA_DeleteOnClose, false); // it deletes itself when its work is done
     m_poll.setInterval(kPollPeriod);
     connect(&m_poll, &QTimer::timeout, this, &COptimizeCustomPropsWaitDlg::OnPoll);
 }
